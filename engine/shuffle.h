@@ -1,0 +1,19 @@
+// engine/shuffle.h: the permutation tables and the excitation shuffle.
+#pragma once
+#include <cstdint>
+#include "engine/synth_state.h"
+
+constexpr int32_t PermutationTableCount = 21;
+
+// 21 constant permutations of 0..8191; table 0 shuffles the drop table once,
+// tables 1..20 the excitation of each block. Compiled-in constant data.
+extern const int16_t PermutationTable[PermutationTableCount][BlockFrames];
+
+// Moves the value at position i to position table[i], for all 8192 i.
+// Uses the first half of FftReal as scratch.
+void PermuteByTable(float* values, const int16_t* table);
+
+// Wraps *blockIndex to 0 when above 524288, applies table 20 - b for every
+// set bit b of it (bit 0 first), then negates every value whose integer
+// part is even. values: 8192 floats, in and out.
+void ShuffleExcitation(float* values, int32_t* blockIndex);
