@@ -11,9 +11,11 @@ float OutputGainFor(int32_t attenuator);   // 327.66 at 1, 3276.6 at 128, 32766.
 float DropWidthFor(int32_t hardness);      // 15 (14.999998) at 1, 45 at 128, 75 at 255
 float ToneGainDbFor(int32_t value);        // -20 dB at 1, 0 at 128, +20 dB at 255
 
-// Engine start values, once before any block: flat responses and drop table,
-// the synthesis window, ramp depth and slope, equaliser band grid, and the
-// full rebuild of every curve at the first block whatever the caches hold.
+// Engine start values, once before any block: flat responses, an empty drop
+// table, the synthesis window, ramp depth and slope, the equaliser band grid.
+// Also sets the process-wide CachedSettings to a value no control holds and
+// EqChanged to 1, so the first block rebuilds every curve and the drop table
+// whatever settings were loaded.
 void InitEngine(SynthRecord* state);
 
 // Engine part of Play: fade-in length and slope from FadeInTime, counters
