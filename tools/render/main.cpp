@@ -143,7 +143,7 @@ void PutBlock(const int16_t* pcm, unsigned char* bytes) {
 }
 
 bool WriteCurves(const char* path, const SynthRecord* s) {
-    FILE* f = std::fopen(path, "w");
+    FILE* f = std::fopen(path, "wb");  // the same bytes on every platform: \n line ends
     if (!f) return false;
     std::fprintf(f, "bin,hz,profile,eq,bass,subbass,treble,total\n");
     for (int32_t b = 0; b < FrameLength; ++b) {
