@@ -76,6 +76,16 @@ else
   bad "--curves failed: $(cat err.txt)"
 fi
 
+# The chime alone: 262 144 frames, its largest sample the volume's peak.
+peak_of() { od -An -td2 -v -j 44 "$1" | awk '{for (i = 1; i <= NF; i++) { v = $i < 0 ? -$i : $i; if (v > m) m = v }} END {print m}'; }
+if render --chime ch.wav --volume 255; then
+  [ "$(u32 ch.wav 40)" -eq $((262144 * 4)) ] && ok || bad "chime data $(u32 ch.wav 40) bytes, expected $((262144 * 4))"
+  [ "$(peak_of ch.wav)" -eq 32766 ] && ok || bad "chime at volume 255 peaks at $(peak_of ch.wav), expected 32766"
+  render --chime ch1.wav --volume 1 && [ "$(peak_of ch1.wav)" -eq 327 ] && ok || bad "chime at volume 1 peaks at $(peak_of ch1.wav), expected 327"
+else
+  bad "--chime failed: $(cat err.txt)"
+fi
+
 # Bad input: exit status 2, a one-line message naming the option, no file.
 expect_error() {
   local option=$1; shift
@@ -107,6 +117,7 @@ expect_error --frobnicate --out bad.wav --frobnicate 3
 expect_error --out --blocks 3
 expect_error --out --out no/such/dir/x.wav
 expect_error --curves --out bad.wav --curves no/such/dir/c.csv
+expect_error --chime --chime no/such/dir/c.wav
 "${tool[@]}" --help 2>/dev/null | grep -q -- "--stop-after" && ok || bad "--help does not list the options"
 
 # The Windows build's tool must write exactly what the native tool writes.
@@ -120,6 +131,11 @@ if [ -n "$native" ]; then
       bad "Windows and native renders differ for '$args': $(cmp win.wav nat.wav 2>&1 | head -1)"
     fi
   done
+fi
+
+if [ -n "$native" ]; then
+  render --chime win.wav --volume 200 && "$native" --chime nat.wav --volume 200
+  cmp -s win.wav nat.wav && ok || bad "Windows and native chimes differ: $(cmp win.wav nat.wav 2>&1 | head -1)"
 fi
 
 echo "render tool: $passed passed, $failed failed"

@@ -15,6 +15,7 @@
 
 #include "app/core_state.h"
 #include "engine/block.h"
+#include "timers/chime.h"
 #include "timers/timer_gains.h"
 #include "tools/render/render.h"
 
@@ -44,6 +45,8 @@ const char UsageText[] =
     "                      ends where playback stops\n"
     "  --start-index N     block index of the first block, 0..524289\n"
     "  --curves FILE.csv   write the response curves after the first block\n"
+    "  --chime FILE.wav    write the alarm chime at --volume (5.461 s); with\n"
+    "                      it, --out may be left out\n"
     "  --progress          show progress on standard error\n"
     "  --help              show this text\n";
 
@@ -53,6 +56,7 @@ constexpr int64_t MaxRawBlocks = 1000000000;    // a limit only against typing m
 struct Options {
     std::string Out;
     std::string Curves;
+    std::string Chime;
     int64_t Blocks = 30;
     bool BlocksGiven = false;
     int32_t StartIndex = 0;
@@ -154,6 +158,28 @@ bool WriteCurves(const char* path, const SynthRecord* s) {
     return std::fclose(f) == 0;
 }
 
+// The chime as the program queues it, written whole under a temporary name.
+bool WriteChime(const std::string& path) {
+    const std::string partial = path + ".partial";
+    FILE* f = std::fopen(partial.c_str(), "wb");
+    if (!f) return false;
+    static unsigned char bytes[ChimeBufferFrames * 4];
+    unsigned char header[44];
+    MakeWavHeader(header, ChimeFrames * 4);
+    bool ok = std::fwrite(header, 1, sizeof header, f) == sizeof header;
+    for (int32_t b = 0; b < ChimeBufferCount && ok; ++b) {
+        PutBlock(ChimePcm + 2 * ChimeBufferFrames * b, bytes);
+        ok = std::fwrite(bytes, 1, sizeof bytes, f) == sizeof bytes;
+    }
+    ok = (std::fclose(f) == 0) && ok;
+    if (ok) {
+        std::remove(path.c_str());  // rename does not replace a file on Windows
+        ok = std::rename(partial.c_str(), path.c_str()) == 0;
+    }
+    if (!ok) std::remove(partial.c_str());
+    return ok;
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
@@ -176,7 +202,7 @@ int main(int argc, char** argv) {
         static const char* const withValue[] = {
             "--out", "--blocks", "--seconds", "--volume", "--hardness", "--bass", "--sub-bass",
             "--treble", "--profile", "--eq", "--fade-in", "--fade-out", "--stop-after",
-            "--start-index", "--curves"};
+            "--start-index", "--curves", "--chime"};
         bool known = false;
         for (const char* name : withValue) known = known || std::strcmp(opt, name) == 0;
         if (!known) return Fail(opt, "unknown option (see --help)");
@@ -187,6 +213,9 @@ int main(int argc, char** argv) {
         if (name == "--out") {
             if (*val == '\0') return Fail(opt, "needs a file name");
             o.Out = val;
+        } else if (name == "--chime") {
+            if (*val == '\0') return Fail(opt, "needs a file name");
+            o.Chime = val;
         } else if (name == "--curves") {
             if (*val == '\0') return Fail(opt, "needs a file name");
             o.Curves = val;
@@ -242,6 +271,11 @@ int main(int argc, char** argv) {
                 return Fail(opt, std::string("'") + val + "' is not a block index 0..524289");
             o.StartIndex = static_cast<int32_t>(n);
         }
+    }
+    if (!o.Chime.empty()) {
+        MakeChime(v[Attenuator]);
+        if (!WriteChime(o.Chime)) return Fail("--chime", "cannot write " + o.Chime);
+        if (o.Out.empty()) return 0;
     }
     if (o.Out.empty()) return Fail("--out", "is required (see --help)");
     if (v[FadeOutOn] == 1 && !o.StopAfterGiven) return Fail("--fade-out", "needs --stop-after");
