@@ -6,6 +6,7 @@
 #include "audio/stream.h"
 #include "engine/block.h"
 #include "engine/platform.h"
+#include "shaping/eq_window.h"
 #include "timers/chime_win.h"
 #include "timers/timer_gains.h"
 
@@ -92,6 +93,10 @@ bool RunCommand(HWND window, int32_t id) {
     case HelpId: HelpSequence(); return true;
     case EqPanelId: ToggleEqPanel(window); return true;
     case EqCloseId: HideEqPanel(window); return true;
+    case EqMemory1Id:
+    case EqMemory1Id + 1:
+    case EqMemory1Id + 2:
+    case EqDefeatId: SelectEqMemory(id); return true;
     default: return false;
     }
 }

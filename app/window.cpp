@@ -6,6 +6,8 @@
 #include "app/globals.h"
 #include "app/time_fields.h"
 #include "engine/block.h"
+#include "settings/registry.h"
+#include "shaping/eq_window.h"
 
 namespace {
 const char ClassName[] = "Sombrel Player";
@@ -21,14 +23,14 @@ LRESULT OnCreate(HWND window) {
 }
 
 LRESULT OnDestroy() {
-    // Saving the settings at exit (after a run with Play) belongs to the
-    // settings module, which is not part of this build yet.
+    SaveSettings();  // writes only after a run in which Play was used
     PostQuitMessage(0);
     return 0;
 }
 
 LRESULT OnSize(HWND window) {
     LayoutWindow(window);
+    LoadSettings();  // acts once, the first time the controls are in place
     return 0;
 }
 
@@ -45,6 +47,11 @@ LRESULT OnCommand(HWND window, UINT message, WPARAM wParam, LPARAM lParam) {
 LRESULT OnHorizontalScroll(WPARAM wParam, LPARAM lParam) {
     // The thumb position travels as a 16-bit word; slider values fit it.
     StepMainSlider(reinterpret_cast<HWND>(lParam), LOWORD(wParam), HIWORD(wParam));
+    return 0;
+}
+
+LRESULT OnVerticalScroll(WPARAM wParam, LPARAM lParam) {
+    ScrollEqBand(reinterpret_cast<HWND>(lParam), LOWORD(wParam), HIWORD(wParam));
     return 0;
 }
 
@@ -74,6 +81,7 @@ LRESULT CALLBACK MainWindowProc(HWND window, UINT message, WPARAM wParam, LPARAM
     case WM_PAINT: return OnPaint(window);
     case WM_COMMAND: return OnCommand(window, message, wParam, lParam);
     case WM_HSCROLL: return OnHorizontalScroll(wParam, lParam);
+    case WM_VSCROLL: return OnVerticalScroll(wParam, lParam);
     case WM_CTLCOLOREDIT: return OnColourEdit(window, message, wParam, lParam);
     case WM_POWERBROADCAST: return OnPowerBroadcast(window);
     case MM_WOM_DONE: return OnDeviceDone(wParam);
