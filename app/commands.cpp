@@ -153,6 +153,16 @@ void StepMainSlider(HWND slider, int32_t code, int32_t position) {
 }
 
 void OnBufferDone(HWAVEOUT device) {
+    // Buffers handed back by a stop come first in the queue, and they are
+    // neither refills nor chime buffers. Telling them by IsPlaying alone is
+    // not enough: a Play handled before they are dispatched would take them
+    // as refills of its new stream (releasing slots the device still plays),
+    // and a chime device opened right after the stop may get the same handle
+    // value, so they would be counted as chime buffers and end it early.
+    if (HandedBack > 0) {
+        --HandedBack;
+        return;
+    }
     if (IsPlaying == 1) {
         // While the main stream plays the chime cannot, so this is the main
         // stream's buffer. A stream error box being open means an operation
@@ -161,12 +171,12 @@ void OnBufferDone(HWAVEOUT device) {
             ++DeferredRefills;
             return;
         }
+        --BuffersQueued;
         ReleaseDoneBlock();
         ProcessBlock(&ControlSettings, &CachedSettings, &SynthState);
         WriteBlock(SynthState.PcmBlock);  // nothing if the block hit the stop time
+        return;
     }
-    // Buffers the main stream hands back at a stop never count as chime
-    // buffers, also when the alarm has just started the chime.
     if (IsChiming == 1 && device == ChimeDevice) OnChimeBufferDone(device);
 }
 

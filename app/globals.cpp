@@ -21,6 +21,8 @@ int32_t WriteSlot;
 int32_t DoneSlot;
 int32_t StreamBoxesOpen;
 int32_t DeferredRefills;
+int32_t BuffersQueued;
+int32_t HandedBack;
 
 char MessageText[200];
 char ModulePath[500];

@@ -36,6 +36,8 @@ extern int32_t WriteSlot;                    // ring slot the next block is copi
 extern int32_t DoneSlot;                     // ring slot the next done-notification releases
 extern int32_t StreamBoxesOpen;              // stream error boxes now on screen (they dispatch messages)
 extern int32_t DeferredRefills;              // done-notifications held back while such a box was open
+extern int32_t BuffersQueued;                // buffers the main device holds (written, not yet done)
+extern int32_t HandedBack;                   // done-notifications still to come for buffers a stop handed back
 
 // Text buffers.
 extern char MessageText[200];        // formatting buffer for registry messages

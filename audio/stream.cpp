@@ -61,7 +61,10 @@ void WriteBlock(const int16_t* block) {
     MMRESULT result = waveOutPrepareHeader(MainDevice, header, sizeof(WAVEHDR));
     if (result != MMSYSERR_NOERROR) ReportStreamError("Error 4529", "Sombrel", result);
     result = waveOutWrite(MainDevice, header, sizeof(WAVEHDR));
-    if (result != MMSYSERR_NOERROR) ReportStreamError("Error 4530", "Sombrel", result);
+    if (result == MMSYSERR_NOERROR)
+        ++BuffersQueued;
+    else
+        ReportStreamError("Error 4530", "Sombrel", result);
     // Moves on after a failure too: the slot order is never resynchronised.
     WriteSlot = (slot + 1) % 3;
 }
@@ -75,11 +78,13 @@ void ReleaseDoneBlock() {
 
 void StopStream() {
     if (IsPlaying != 1) return;
-    // The reset hands back every queued buffer; their notifications arrive
-    // after IsPlaying is 0 below and are ignored by the window.
     MMRESULT result = waveOutReset(MainDevice);
     if (result != MMSYSERR_NOERROR) ReportStreamError("Error 4534", "Sombrel Player", result);
     IsPlaying = 0;
+    // Every buffer the device held comes back with a notification of its
+    // own, posted now but dispatched later (see OnBufferDone).
+    HandedBack += BuffersQueued;
+    BuffersQueued = 0;
     for (int32_t i = 0; i < 3; ++i) {
         // A header that was never prepared is left alone by the device.
         result = waveOutUnprepareHeader(MainDevice, &WaveHeaders[i], sizeof(WAVEHDR));

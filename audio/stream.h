@@ -22,7 +22,9 @@ void WriteBlock(const int16_t* block);
 void ReleaseDoneBlock();
 
 // Stops and closes the device, clears IsPlaying, enables the controls Play
-// disabled and empties the meter. Does nothing unless IsPlaying is 1.
+// disabled and empties the meter. Does nothing unless IsPlaying is 1. The
+// buffers the device still held are counted into HandedBack: their
+// notifications are still to come and are no refills.
 void StopStream();
 
 // True while a stream error box is on screen. Its modal loop dispatches
