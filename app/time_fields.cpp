@@ -1,35 +1,26 @@
 #include "app/time_fields.h"
-#include <cstdlib>
-#include "app/globals.h"
 #include "app/core_state.h"
+#include "app/globals.h"
+#include "timers/time_text.h"
 
 namespace {
 enum FieldIndex : int32_t { MinuteSlot = 0, HourSlot = 1, FadeInSlot = 2, FadeOutSlot = 3 };
-
-// Only the first two characters are looked at: empty fails, and each must
-// be a digit or a full stop.
-bool CheckTimeField(HWND field) {
-    char text[3] = {0, 0, 0};
-    const int n = GetWindowTextA(field, text, sizeof(text));
-    if (n <= 0) return false;
-    for (int i = 0; i < n; ++i)
-        if (!((text[i] >= '0' && text[i] <= '9') || text[i] == '.')) return false;
-    return true;
-}
 
 // Checks one field, stores its value (also when out of range) and rewrites
 // its text as the stored integer. Leaves the stored value alone when the
 // text itself is unacceptable.
 void ParseTimeField(HWND field, int32_t slot, int32_t fieldIndex, int32_t low, int32_t high,
                     int32_t* result) {
-    if (!CheckTimeField(field)) {
+    // Only the first two characters are checked, but four are converted.
+    char text[5] = {0, 0, 0, 0, 0};
+    GetWindowTextA(field, text, 3);
+    if (!CheckTimeText(text)) {
         FieldValid[slot] = 0;
         *result = 0;
         return;
     }
-    char text[5] = {0, 0, 0, 0, 0};
     GetWindowTextA(field, text, sizeof(text));
-    const int32_t value = static_cast<int32_t>(std::atof(text));
+    const int32_t value = TimeTextValue(text);
     ControlSettings.Value[fieldIndex] = value;
     char shown[16];
     wsprintfA(shown, "%d", value);
