@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 #include <windows.h>
 #include <mmsystem.h>
+#include <psapi.h>
 #include <cstdio>
 #include <fstream>
 #include <set>
@@ -786,7 +787,23 @@ int MeasureFigures(const char* exe, const char* seconds) {
     if (!Click(p, PlayId)) return 1;
     std::printf("playing-pid %lu\n", p.Process.dwProcessId);
     std::fflush(stdout);
+    FILETIME created, ended, kernel0, user0, kernel1, user1;
+    GetProcessTimes(p.Process.hProcess, &created, &ended, &kernel0, &user0);
+    const ULONGLONG start = GetTickCount64();
     Sleep(static_cast<DWORD>(std::atof(seconds) * 1000));
+    GetProcessTimes(p.Process.hProcess, &created, &ended, &kernel1, &user1);
+    const double elapsed = (GetTickCount64() - start) / 1000.0;
+    auto ticks = [](const FILETIME& f) {
+        return static_cast<double>((static_cast<ULONGLONG>(f.dwHighDateTime) << 32) | f.dwLowDateTime);
+    };
+    const double busy = (ticks(kernel1) - ticks(kernel0) + ticks(user1) - ticks(user0)) / 1e7;
+    std::printf("cpu-percent-windows %.2f\n", 100.0 * busy / elapsed);
+    PROCESS_MEMORY_COUNTERS_EX memory = {};
+    memory.cb = sizeof(memory);
+    if (K32GetProcessMemoryInfo(p.Process.hProcess, reinterpret_cast<PROCESS_MEMORY_COUNTERS*>(&memory),
+                                sizeof(memory)))
+        std::printf("private-bytes-windows %llu\n", static_cast<unsigned long long>(memory.PrivateUsage));
+    std::fflush(stdout);
     if (!Click(p, StopId)) return 1;
     return CloseProgram(&p) == 0 ? 0 : 1;
 }
