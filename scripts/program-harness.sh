@@ -76,7 +76,10 @@ harness_up() {
   say "== a new Wine prefix"
   wineboot -i >"$work/wineboot.log" 2>&1
   wineserver -w
-  # A virtual desktop gives the windows their frames, as on Windows.
+  # A virtual desktop gives the windows their frames, as on Windows. The
+  # desktop is made when the Wine server starts, so the server that wrote
+  # the setting is let go before the tests start a new one.
   "$wine_run" reg add 'HKCU\Software\Wine\Explorer' /v Desktop /d Default /f >/dev/null 2>&1
   "$wine_run" reg add 'HKCU\Software\Wine\Explorer\Desktops' /v Default /d 1024x768 /f >/dev/null 2>&1
+  wineserver -w
 }

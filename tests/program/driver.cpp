@@ -363,41 +363,19 @@ bool CaptureClient(const Program& program, Picture* picture) {
     return CaptureScreenRect(origin.x, origin.y, client.right, client.bottom, picture);
 }
 
-bool CaptureWindow(HWND window, Picture* picture) {
-    RECT r = OuterRect(window);
-    return CaptureScreenRect(r.left, r.top, r.right - r.left, r.bottom - r.top, picture);
-}
-
-bool SaveBitmap(const Picture& picture, const std::string& path) {
-    FILE* f = std::fopen(path.c_str(), "wb");
-    if (f == nullptr) return false;
-    BITMAPFILEHEADER file = {};
-    BITMAPINFOHEADER header = {};
-    const uint32_t bytes = static_cast<uint32_t>(picture.Pixels.size() * 4);
-    file.bfType = 0x4D42;
-    file.bfOffBits = sizeof(file) + sizeof(header);
-    file.bfSize = file.bfOffBits + bytes;
-    header.biSize = sizeof(header);
-    header.biWidth = picture.Width;
-    header.biHeight = -picture.Height;
-    header.biPlanes = 1;
-    header.biBitCount = 32;
-    header.biCompression = BI_RGB;
-    header.biSizeImage = bytes;
-    std::fwrite(&file, sizeof(file), 1, f);
-    std::fwrite(&header, sizeof(header), 1, f);
-    std::fwrite(picture.Pixels.data(), 4, picture.Pixels.size(), f);
-    return std::fclose(f) == 0;
-}
-
-bool AskHarness(const char* request, DWORD ms) {
+bool AskHarness(const char* request, const std::string& detail, DWORD ms) {
     if (Config.Requests.empty()) return false;
     const std::string path = Config.Requests + "\\" + request;
     const std::string done = path + ".done";
     DeleteFileA(done.c_str());
-    FILE* f = std::fopen(path.c_str(), "wb");
+    // Written under another name and renamed, so the harness never reads a
+    // request half written.
+    const std::string temporary = path + ".part";
+    FILE* f = std::fopen(temporary.c_str(), "wb");
     if (f == nullptr) return false;
+    std::fputs(detail.c_str(), f);
     std::fclose(f);
+    if (!MoveFileExA(temporary.c_str(), path.c_str(), MOVEFILE_REPLACE_EXISTING)) return false;
     return WaitFor([&] { return GetFileAttributesA(done.c_str()) != INVALID_FILE_ATTRIBUTES; }, ms);
 }
 

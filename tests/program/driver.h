@@ -102,14 +102,12 @@ struct Picture {
 };
 // The client area of the main window, from the screen.
 bool CaptureClient(const Program& program, Picture* picture);
-// The whole window with its frame, from the screen.
-bool CaptureWindow(HWND window, Picture* picture);
-bool SaveBitmap(const Picture& picture, const std::string& path);
 uint32_t Rgb(uint8_t r, uint8_t g, uint8_t b);   // in the Picture's pixel format
 
 // Asks the harness to do something outside Wine (start or stop the sound
-// server) and waits for it to confirm. False without a harness.
-bool AskHarness(const char* request, DWORD ms = 30000);
+// server, take a screenshot) and waits for it to confirm. The request's
+// file holds `detail`. False without a harness.
+bool AskHarness(const char* request, const std::string& detail = "", DWORD ms = 30000);
 
 // Size in bytes of a file (the harness's running recording), -1 if absent.
 int64_t FileSize(const std::string& path);
