@@ -24,7 +24,7 @@ struct MeterRecord {
     int32_t PeakLeft;        // largest absolute left sample of the last block
     int32_t PeakRight;       // largest absolute right sample of the last block
     HDC PaintDc;             // valid between BeginPaint and EndPaint
-    PAINTSTRUCT Paint;
+    PAINTSTRUCT Paint;       // the paint step's BeginPaint record
 };
 
 // Creates the four brushes; once, by the application initialiser.

@@ -267,7 +267,7 @@ TEST_F(FirstStart, WindowIs750By270AndKeepsThatSize) {
     EXPECT_EQ(r.bottom - r.top, 270) << "GetWindowRect height " << r.bottom - r.top << ", expected 270";
     // The user drags the frame: the window is given another size.
     SetWindowPos(P.Window, nullptr, r.left, r.top, 900, 400, SWP_NOZORDER | SWP_NOACTIVATE);
-    ASSERT_TRUE(Settle(P));
+    ASSERT_TRUE(Settle(P)) << "SendMessageTimeout(WM_NULL) timed out; expected the program back in its message loop";
     RECT after = OuterRect(P.Window);
     EXPECT_EQ(after.right - after.left, 750)
         << "after SetWindowPos(900 x 400) the width is " << after.right - after.left << ", expected 750";
@@ -290,14 +290,14 @@ TEST_F(FirstStart, PanelButtonOpensTo580AndClosesTo270) {
     EXPECT_TRUE(IsWindowVisible(C(EqLockId))) << "\"EQ Lock\" is hidden with the panel open";
     EXPECT_TRUE(IsChecked(C(EqLockId))) << "BM_GETCHECK of \"EQ Lock\" gave 0 after the panel button, expected 1";
 
-    ASSERT_TRUE(Click(P, EqPanelId));
+    ASSERT_TRUE(Click(P, EqPanelId)) << "SendMessageTimeout(BM_CLICK) to control " << (EqPanelId) << " timed out; expected the click handled";
     r = OuterRect(P.Window);
     EXPECT_EQ(r.bottom - r.top, 270) << "after the second press the height is " << r.bottom - r.top << ", expected 270";
     for (int32_t id = 5; id <= 35; ++id)
         EXPECT_FALSE(IsWindowVisible(C(id))) << "band slider " << id << " visible with the panel closed";
 
-    ASSERT_TRUE(Click(P, EqPanelId));
-    ASSERT_TRUE(Click(P, EqCloseId));
+    ASSERT_TRUE(Click(P, EqPanelId)) << "SendMessageTimeout(BM_CLICK) to control " << (EqPanelId) << " timed out; expected the click handled";
+    ASSERT_TRUE(Click(P, EqCloseId)) << "SendMessageTimeout(BM_CLICK) to control " << (EqCloseId) << " timed out; expected the click handled";
     r = OuterRect(P.Window);
     EXPECT_EQ(r.bottom - r.top, 270) << "after the close button the height is " << r.bottom - r.top << ", expected 270";
     EXPECT_FALSE(IsWindowVisible(C(EqLockId))) << "\"EQ Lock\" visible after the close button";
@@ -328,18 +328,18 @@ TEST_F(Commands, SecondPlayDoesNothingAndStopWhenStoppedDoesNothing) {
     ASSERT_TRUE(Click(P, StopId)) << "BM_CLICK on Stop while stopped was not answered within 10 s";
     ExpectNoBox("Stop while stopped");
     EXPECT_TRUE(Stopped()) << "Stop while stopped changed the enabled controls";
-    ASSERT_TRUE(Click(P, PlayId));
+    ASSERT_TRUE(Click(P, PlayId)) << "SendMessageTimeout(BM_CLICK) to control " << (PlayId) << " timed out; expected the click handled";
     ASSERT_TRUE(Playing()) << "Play did not disable the timer controls";
     ASSERT_TRUE(Click(P, PlayId)) << "the second BM_CLICK on Play was not answered within 10 s";
     ExpectNoBox("a second Play");
     EXPECT_TRUE(Playing()) << "a second Play changed the enabled controls";
-    ASSERT_TRUE(Click(P, StopId));
+    ASSERT_TRUE(Click(P, StopId)) << "SendMessageTimeout(BM_CLICK) to control " << (StopId) << " timed out; expected the click handled";
     EXPECT_TRUE(Stopped()) << "Stop did not enable the timer controls again";
     EXPECT_FALSE(Enabled(FadeOutId)) << "Stop enabled \"Fade Out\" with Stop Time and Alarm off";
     EXPECT_FALSE(Enabled(FadeOutFieldId)) << "Stop enabled the fade-out field with Stop Time and Alarm off";
-    ASSERT_TRUE(Click(P, StopId));
+    ASSERT_TRUE(Click(P, StopId)) << "SendMessageTimeout(BM_CLICK) to control " << (StopId) << " timed out; expected the click handled";
     ExpectNoBox("a second Stop");
-    EXPECT_TRUE(Stopped());
+    EXPECT_TRUE(Stopped()) << "a second Stop changed the enabled controls";
 }
 
 TEST_F(Commands, StopEnablesTheFadeOutPairWhenStopTimeIsOn) {
@@ -351,47 +351,47 @@ TEST_F(Commands, StopEnablesTheFadeOutPairWhenStopTimeIsOn) {
                         SMTO_NORMAL, 5000, nullptr);
     SendMessageTimeoutA(C(MinuteId), WM_SETTEXT, 0,
                         reinterpret_cast<LPARAM>(std::to_string(now.wMinute).c_str()), SMTO_NORMAL, 5000, nullptr);
-    ASSERT_TRUE(Click(P, now.wHour < 12 ? PmId : AmId));
-    ASSERT_TRUE(Click(P, StopTimeId));
+    ASSERT_TRUE(Click(P, now.wHour < 12 ? PmId : AmId)) << "SendMessageTimeout(BM_CLICK) to control " << (now.wHour < 12 ? PmId : AmId) << " timed out; expected the click handled";
+    ASSERT_TRUE(Click(P, StopTimeId)) << "SendMessageTimeout(BM_CLICK) to control " << (StopTimeId) << " timed out; expected the click handled";
     EXPECT_TRUE(IsChecked(C(StopTimeId))) << "BM_GETCHECK of \"Stop Time\" gave 0 after a click";
     EXPECT_TRUE(Enabled(FadeOutId)) << "\"Fade Out\" still disabled after checking \"Stop Time\"";
     EXPECT_TRUE(Enabled(FadeOutFieldId)) << "fade-out field still disabled after checking \"Stop Time\"";
-    ASSERT_TRUE(Click(P, PlayId));
+    ASSERT_TRUE(Click(P, PlayId)) << "SendMessageTimeout(BM_CLICK) to control " << (PlayId) << " timed out; expected the click handled";
     ExpectNoBox("Play with a valid stop time");
     EXPECT_TRUE(Playing()) << "Play with a valid stop time did not start";
-    ASSERT_TRUE(Click(P, StopId));
+    ASSERT_TRUE(Click(P, StopId)) << "SendMessageTimeout(BM_CLICK) to control " << (StopId) << " timed out; expected the click handled";
     EXPECT_TRUE(Stopped()) << "Stop did not enable the timer controls";
     EXPECT_TRUE(Enabled(FadeOutId)) << "Stop left \"Fade Out\" disabled although Stop Time is on";
     EXPECT_TRUE(Enabled(FadeOutFieldId)) << "Stop left the fade-out field disabled although Stop Time is on";
-    ASSERT_TRUE(Click(P, StopTimeId));
+    ASSERT_TRUE(Click(P, StopTimeId)) << "SendMessageTimeout(BM_CLICK) to control " << (StopTimeId) << " timed out; expected the click handled";
     EXPECT_FALSE(Enabled(FadeOutId)) << "unchecking \"Stop Time\" left \"Fade Out\" enabled";
 }
 
 TEST_F(Commands, DogsChecksOnlyItself) {
-    ASSERT_TRUE(Click(P, DogsId));
+    ASSERT_TRUE(Click(P, DogsId)) << "SendMessageTimeout(BM_CLICK) to control " << (DogsId) << " timed out; expected the click handled";
     for (int32_t id = WhiteId; id <= TrafficId; ++id)
         EXPECT_EQ(IsChecked(C(id)), id == DogsId)
             << "after \" Dogs\", BM_GETCHECK of profile button " << id << " gave " << IsChecked(C(id));
-    ASSERT_TRUE(Click(P, TrafficId));
+    ASSERT_TRUE(Click(P, TrafficId)) << "SendMessageTimeout(BM_CLICK) to control " << (TrafficId) << " timed out; expected the click handled";
     for (int32_t id = WhiteId; id <= TrafficId; ++id)
         EXPECT_EQ(IsChecked(C(id)), id == TrafficId)
             << "after \" Traffic\", BM_GETCHECK of profile button " << id << " gave " << IsChecked(C(id));
 }
 
 TEST_F(Commands, AmAndPmHoldOppositeStates) {
-    ASSERT_TRUE(Click(P, PmId));
+    ASSERT_TRUE(Click(P, PmId)) << "SendMessageTimeout(BM_CLICK) to control " << (PmId) << " timed out; expected the click handled";
     EXPECT_TRUE(IsChecked(C(PmId)) && !IsChecked(C(AmId))) << "after \"PM\": AM " << IsChecked(C(AmId))
                                                              << " PM " << IsChecked(C(PmId)) << ", expected 0 1";
-    ASSERT_TRUE(Click(P, AmId));
+    ASSERT_TRUE(Click(P, AmId)) << "SendMessageTimeout(BM_CLICK) to control " << (AmId) << " timed out; expected the click handled";
     EXPECT_TRUE(IsChecked(C(AmId)) && !IsChecked(C(PmId))) << "after \"AM\": AM " << IsChecked(C(AmId))
                                                              << " PM " << IsChecked(C(PmId)) << ", expected 1 0";
 }
 
 TEST_F(Commands, AlarmShowsTheChimeButtonOnlyWhileOn) {
-    ASSERT_TRUE(Click(P, AlarmId));
+    ASSERT_TRUE(Click(P, AlarmId)) << "SendMessageTimeout(BM_CLICK) to control " << (AlarmId) << " timed out; expected the click handled";
     EXPECT_TRUE(IsWindowVisible(C(ChimeTestId))) << "chime test button hidden with \"Alarm\" checked";
     EXPECT_TRUE(Enabled(FadeOutId)) << "\"Fade Out\" disabled with \"Alarm\" checked";
-    ASSERT_TRUE(Click(P, AlarmId));
+    ASSERT_TRUE(Click(P, AlarmId)) << "SendMessageTimeout(BM_CLICK) to control " << (AlarmId) << " timed out; expected the click handled";
     EXPECT_FALSE(IsWindowVisible(C(ChimeTestId))) << "chime test button visible with \"Alarm\" unchecked";
     EXPECT_FALSE(Enabled(FadeOutId)) << "\"Fade Out\" enabled with \"Alarm\" unchecked";
 }
@@ -427,7 +427,7 @@ int32_t BarEnd(const Picture& picture, int32_t row) {
 }
 
 TEST_F(Meter, BarsShowWhilePlayingAndGoAfterStop) {
-    ASSERT_TRUE(Click(P, PlayId));
+    ASSERT_TRUE(Click(P, PlayId)) << "SendMessageTimeout(BM_CLICK) to control " << (PlayId) << " timed out; expected the click handled";
     Picture picture;
     ASSERT_TRUE(WaitFor([&] {
         return CaptureClient(P, &picture) && BarEnd(picture, 5) > 16 && BarEnd(picture, 15) > 16;
@@ -447,15 +447,15 @@ TEST_F(Meter, BarsShowWhilePlayingAndGoAfterStop) {
         EXPECT_TRUE(AskHarness("screenshot", geometry)) << "the harness took no screenshot";
     }
 
-    ASSERT_TRUE(Click(P, StopId));
+    ASSERT_TRUE(Click(P, StopId)) << "SendMessageTimeout(BM_CLICK) to control " << (StopId) << " timed out; expected the click handled";
     EXPECT_TRUE(WaitFor([&] {
         return CaptureClient(P, &picture) && BarEnd(picture, 5) == 15 && BarEnd(picture, 15) == 15;
     }, 5000)) << "after Stop the bars still end at x " << BarEnd(picture, 5) << " and " << BarEnd(picture, 15)
               << ", expected no bar";
     // Covering and uncovering repaints empty bars.
     InvalidateRect(P.Window, nullptr, TRUE);
-    ASSERT_TRUE(Settle(P));
-    ASSERT_TRUE(CaptureClient(P, &picture));
+    ASSERT_TRUE(Settle(P)) << "SendMessageTimeout(WM_NULL) timed out; expected the program back in its message loop";
+    ASSERT_TRUE(CaptureClient(P, &picture)) << "BitBlt from the screen failed";
     EXPECT_EQ(BarEnd(picture, 5), 15) << "a repaint while stopped shows an upper bar to x " << BarEnd(picture, 5);
 }
 
@@ -521,7 +521,7 @@ TEST_F(Help, AboutBoxComesFirstAndTheManualOpensAfterIt) {
     // While the box is open the manual must not be opened: the shell would
     // have done so within this second if it had been asked.
     EXPECT_FALSE(WaitFor([&] { return Opened(); }, 1500)) << "the manual was opened while the about box was open";
-    ASSERT_TRUE(CloseBox(about));
+    ASSERT_TRUE(CloseBox(about)) << "WM_COMMAND IDOK to the about box left it open";
     ASSERT_TRUE(WaitFor([&] { return Opened(); }, 20000)) << "the manual was not opened within 20 s of closing the about box";
     std::ifstream marker(Marker.c_str());
     std::string opened;
@@ -534,7 +534,7 @@ TEST_F(Help, WithoutTheManualTheProgramShowsNothingOfItsOwn) {
     ClickAsync(P, HelpId);
     Box about;
     ASSERT_TRUE(WaitForBox(P, &about)) << "Help showed no box within 20 s";
-    ASSERT_TRUE(CloseBox(about));
+    ASSERT_TRUE(CloseBox(about)) << "WM_COMMAND IDOK to the about box left it open";
     // Whatever the shell says about the missing file is the shell's; the
     // program itself adds no box with its captions.
     const bool own = WaitFor([&] {
@@ -551,16 +551,17 @@ TEST_F(Help, WithoutTheManualTheProgramShowsNothingOfItsOwn) {
 
 TEST(Closing, ExitCodeIsZeroAfterANormalClose) {
     Program p;
-    ASSERT_TRUE(LaunchProgram(&p));
+    ASSERT_TRUE(LaunchProgram(&p)) << "LaunchProgram(" << Config.ProgramPath << ") showed no window within 30 s";
     const int32_t code = CloseProgram(&p);
     EXPECT_EQ(code, 0) << "exit code after WM_CLOSE was " << code << ", expected 0";
 }
 
 TEST(Closing, ClosingWhilePlayingEndsCleanly) {
     Program p;
-    ASSERT_TRUE(LaunchProgram(&p));
-    ASSERT_TRUE(Click(p, PlayId));
-    ASSERT_TRUE(WaitFor([&] { return !IsWindowEnabled(Control(p, StopTimeId)); }, 5000));
+    ASSERT_TRUE(LaunchProgram(&p)) << "LaunchProgram(" << Config.ProgramPath << ") showed no window within 30 s";
+    ASSERT_TRUE(Click(p, PlayId)) << "SendMessageTimeout(BM_CLICK) to control " << (PlayId) << " timed out; expected the click handled";
+    ASSERT_TRUE(WaitFor([&] { return !IsWindowEnabled(Control(p, StopTimeId)); }, 5000))
+        << "\"Stop Time\" still enabled 5 s after Play; expected disabled while playing";
     const int32_t code = CloseProgram(&p);
     EXPECT_EQ(code, 0) << "exit code after WM_CLOSE while playing was " << code << ", expected 0";
 }
@@ -580,7 +581,7 @@ TEST_F(Soak, TwoHundredPlayStopCyclesLeakNothing) {
         ASSERT_TRUE(Click(P, StopId)) << "cycle " << cycle << ": Stop was not answered within 10 s";
         ASSERT_TRUE(Stopped()) << "cycle " << cycle << ": not stopped after Stop";
         if (cycle == 10) {
-            ASSERT_TRUE(Settle(P));
+            ASSERT_TRUE(Settle(P)) << "SendMessageTimeout(WM_NULL) timed out; expected the program back in its message loop";
             handles = KernelHandleCount(P.Process.dwProcessId);
             gdi = GdiObjectCount(P.Process.hProcess);
             windows = WindowCount(P.Process.dwProcessId);
@@ -589,7 +590,7 @@ TEST_F(Soak, TwoHundredPlayStopCyclesLeakNothing) {
         }
     }
     ExpectNoBox("200 cycles");
-    ASSERT_TRUE(Settle(P));
+    ASSERT_TRUE(Settle(P)) << "SendMessageTimeout(WM_NULL) timed out; expected the program back in its message loop";
     const int32_t handlesAfter = KernelHandleCount(P.Process.dwProcessId);
     const int32_t gdiAfter = GdiObjectCount(P.Process.hProcess);
     const int32_t windowsAfter = WindowCount(P.Process.dwProcessId);
@@ -647,20 +648,21 @@ TEST_F(NoSoundServer, PlayShowsEveryFailureAndStopBringsTheProgramBack) {
         ClickAsync(P, PlayId);
         Box code, text;
         ASSERT_TRUE(WaitForBox(P, &code)) << "round " << round << ": Play without a device showed no box";
-        EXPECT_EQ(code.Text, "Error 4528");
-        EXPECT_EQ(code.Caption, "Sombrel Player");
-        EXPECT_FALSE(code.HasIcon);
+        EXPECT_EQ(code.Text, "Error 4528") << "round " << round << ": text of the first box of Play";
+        EXPECT_EQ(code.Caption, "Sombrel Player") << "round " << round << ": caption of \"Error 4528\"";
+        EXPECT_FALSE(code.HasIcon) << "round " << round << ": \"Error 4528\" shows an icon; expected none";
         CloseBox(code);
-        ASSERT_TRUE(WaitForBox(P, &text));
+        ASSERT_TRUE(WaitForBox(P, &text)) << "round " << round << ": no device text after \"Error 4528\"";
         EXPECT_EQ(text.Text, expectedText) << "the device's text after \"Error 4528\"";
-        EXPECT_TRUE(text.HasIcon);
+        EXPECT_TRUE(text.HasIcon) << "round " << round << ": the device text shows no icon; expected the exclamation";
         CloseBox(text);
         for (int32_t block = 0; block < 2; ++block) {
             NextPair("Error 4529", "Sombrel");
             NextPair("Error 4530", "Sombrel");
         }
-        ASSERT_TRUE(WaitFor([&] { return OpenBoxes(P).empty(); }, 5000));
-        ASSERT_TRUE(Settle(P));
+        ASSERT_TRUE(WaitFor([&] { return OpenBoxes(P).empty(); }, 5000))
+            << "round " << round << ": a box is still open after the two blocks' boxes";
+        ASSERT_TRUE(Settle(P)) << "SendMessageTimeout(WM_NULL) timed out; expected the program back in its message loop";
         EXPECT_TRUE(Playing()) << "round " << round << ": after the failed open the program is not in the playing state";
         ClickAsync(P, StopId);
         NextPair("Error 4534", "Sombrel Player");
@@ -674,7 +676,7 @@ TEST_F(NoSoundServer, PlayShowsEveryFailureAndStopBringsTheProgramBack) {
         }
         NextPair("Error 4535", "Sombrel Player");
         ASSERT_TRUE(WaitFor([&] { return OpenBoxes(P).empty(); }, 5000)) << "a box is left after Stop";
-        ASSERT_TRUE(Settle(P));
+        ASSERT_TRUE(Settle(P)) << "SendMessageTimeout(WM_NULL) timed out; expected the program back in its message loop";
         EXPECT_TRUE(Stopped()) << "round " << round << ": Stop did not bring the program back to the stopped state";
     }
 }
@@ -682,8 +684,8 @@ TEST_F(NoSoundServer, PlayShowsEveryFailureAndStopBringsTheProgramBack) {
 // The sound server goes away while the program runs and comes back: Play
 // fails with its boxes while it is away and plays again once it is back.
 TEST_F(NoSoundServer, PlayWorksAgainWhenTheDeviceIsBack) {
-    ASSERT_TRUE(Click(P, PlayId));
-    ASSERT_TRUE(Click(P, StopId));
+    ASSERT_TRUE(Click(P, PlayId)) << "SendMessageTimeout(BM_CLICK) to control " << (PlayId) << " timed out; expected the click handled";
+    ASSERT_TRUE(Click(P, StopId)) << "SendMessageTimeout(BM_CLICK) to control " << (StopId) << " timed out; expected the click handled";
     ASSERT_TRUE(AskHarness("stop-sound-server")) << "the harness did not stop the sound server";
     ClickAsync(P, PlayId);
     Box first;
@@ -699,16 +701,16 @@ TEST_F(NoSoundServer, PlayWorksAgainWhenTheDeviceIsBack) {
     answerAll();
     ClickAsync(P, StopId);
     answerAll();
-    ASSERT_TRUE(Settle(P));
+    ASSERT_TRUE(Settle(P)) << "SendMessageTimeout(WM_NULL) timed out; expected the program back in its message loop";
     EXPECT_TRUE(Stopped()) << "Stop did not bring the program back";
     ASSERT_TRUE(AskHarness("start-sound-server")) << "the harness did not start the sound server";
     ASSERT_TRUE(Click(P, PlayId)) << "Play with the device back was not answered within 10 s";
     ExpectNoBox("Play with the device back");
-    EXPECT_TRUE(Playing());
+    EXPECT_TRUE(Playing()) << "with the device back, Play left timer controls enabled; expected the playing state";
     Picture picture;
     EXPECT_TRUE(WaitFor([&] { return CaptureClient(P, &picture) && BarEnd(picture, 5) > 16; }, 10000))
         << "with the device back the meter shows no sound within 10 s";
-    ASSERT_TRUE(Click(P, StopId));
+    ASSERT_TRUE(Click(P, StopId)) << "SendMessageTimeout(BM_CLICK) to control " << (StopId) << " timed out; expected the click handled";
     ExpectNoBox("Stop with the device back");
 }
 
@@ -741,30 +743,30 @@ protected:
 TEST_F(Sound, PlaysWhatTheRenderMakes) {
     ASSERT_GE(Recorded(), 0) << "the recording " << Capture << " does not exist";
     Note("begin plain");
-    ASSERT_TRUE(Click(P, PlayId));
+    ASSERT_TRUE(Click(P, PlayId)) << "SendMessageTimeout(BM_CLICK) to control " << (PlayId) << " timed out; expected the click handled";
     ASSERT_TRUE(RecordFor(4)) << "the recording did not grow by 4 s";
     // A second Play while playing must not restart the sound: the harness
     // finds the render continuing without a break.
-    ASSERT_TRUE(Click(P, PlayId));
+    ASSERT_TRUE(Click(P, PlayId)) << "SendMessageTimeout(BM_CLICK) to control " << (PlayId) << " timed out; expected the click handled";
     ASSERT_TRUE(RecordFor(8)) << "the recording did not grow by 8 s";
-    ASSERT_TRUE(Click(P, StopId));
-    ASSERT_TRUE(RecordFor(0.5));
+    ASSERT_TRUE(Click(P, StopId)) << "SendMessageTimeout(BM_CLICK) to control " << (StopId) << " timed out; expected the click handled";
+    ASSERT_TRUE(RecordFor(0.5)) << "the recording did not grow by 0.5 s in time; expected the sound server to record";
     Note("end plain");
     ExpectNoBox("playing");
 }
 
 TEST_F(Sound, VolumeAndProfileChangesAreHeardWithinTwoBlocks) {
     Note("begin changes");
-    ASSERT_TRUE(Click(P, PlayId));
-    ASSERT_TRUE(RecordFor(3));
+    ASSERT_TRUE(Click(P, PlayId)) << "SendMessageTimeout(BM_CLICK) to control " << (PlayId) << " timed out; expected the click handled";
+    ASSERT_TRUE(RecordFor(3)) << "the recording did not grow by 3 s in time; expected the sound server to record";
     Scroll(P, VolumeId, SB_THUMBPOSITION, 200);
     Note("volume 200");
-    ASSERT_TRUE(RecordFor(3));
-    ASSERT_TRUE(Click(P, DogsId));
+    ASSERT_TRUE(RecordFor(3)) << "the recording did not grow by 3 s in time; expected the sound server to record";
+    ASSERT_TRUE(Click(P, DogsId)) << "SendMessageTimeout(BM_CLICK) to control " << (DogsId) << " timed out; expected the click handled";
     Note("profile 107");
-    ASSERT_TRUE(RecordFor(3));
-    ASSERT_TRUE(Click(P, StopId));
-    ASSERT_TRUE(RecordFor(0.5));
+    ASSERT_TRUE(RecordFor(3)) << "the recording did not grow by 3 s in time; expected the sound server to record";
+    ASSERT_TRUE(Click(P, StopId)) << "SendMessageTimeout(BM_CLICK) to control " << (StopId) << " timed out; expected the click handled";
+    ASSERT_TRUE(RecordFor(0.5)) << "the recording did not grow by 0.5 s in time; expected the sound server to record";
     Note("end changes");
     ExpectNoBox("playing");
 }

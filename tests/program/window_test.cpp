@@ -108,7 +108,7 @@ TEST(MainSlider, StepsStayWithinTheRangeWhenStoppedAndWhilePlaying) {
     PumpUntil([] { return DoneSlot == 2; }, 2000);
     CheckSteps("playing, after refills");
     Command(StopId);
-    EXPECT_EQ(IsPlaying, 0);
+    EXPECT_EQ(IsPlaying, 0) << "IsPlaying after the Stop command";
 }
 
 // ---------------------------------------------------------------- the meter
@@ -148,7 +148,7 @@ std::string Row(HDC dc, int32_t y, int32_t* blueEnd, int32_t* redEnd) {
 
 TEST(MeterGeometry, PeakOf28000IsBlueTo673And28001RedTo674UpperBarRight) {
     Command(PlayId);
-    ASSERT_EQ(IsPlaying, 1);
+    ASSERT_EQ(IsPlaying, 1) << "IsPlaying after the Play command";
     // Between two blocks nothing else runs on this thread: the peaks given
     // here are painted before the next buffer-done notification.
     static float right[BlockFrames], left[BlockFrames];
@@ -202,7 +202,7 @@ bool RingInOrder() { return (WriteSlot - DoneSlot + 3) % 3 == 2; }
 
 TEST(Ring, SlotsAreUsedInOrderAndStopStartsAgainAtSlot0) {
     Command(PlayId);
-    ASSERT_EQ(IsPlaying, 1);
+    ASSERT_EQ(IsPlaying, 1) << "IsPlaying after the Play command";
     EXPECT_EQ(WriteSlot, 2) << "after Play the next slot to write is " << WriteSlot << ", expected 2";
     EXPECT_EQ(DoneSlot, 0) << "after Play the next slot to release is " << DoneSlot << ", expected 0";
     EXPECT_EQ(SynthState.BlockIndex, 2) << "BlockIndex after the two blocks of Play";
@@ -214,7 +214,7 @@ TEST(Ring, SlotsAreUsedInOrderAndStopStartsAgainAtSlot0) {
         EXPECT_EQ(SynthState.BlockIndex, 2 + expectedDone) << "BlockIndex after refill " << expectedDone;
     }
     Command(StopId);
-    EXPECT_EQ(IsPlaying, 0);
+    EXPECT_EQ(IsPlaying, 0) << "IsPlaying after the Stop command";
     EXPECT_TRUE(WriteSlot == 0 && DoneSlot == 0) << "after Stop WriteSlot " << WriteSlot << ", DoneSlot " << DoneSlot;
     for (int32_t i = 0; i < 3; ++i)
         EXPECT_EQ(WaveHeaders[i].dwFlags & WHDR_PREPARED, 0u) << "header " << i << " still prepared after Stop";
@@ -277,8 +277,8 @@ TEST(Ring, PlayRightAfterStopIgnoresTheBuffersTheStopHandedBack) {
         ASSERT_TRUE(PumpUntil([] { return DoneSlot == 1; }, 3000)) << "round " << round << ": no refill";
         Command(StopId);
         Command(PlayId);
-        ASSERT_EQ(IsPlaying, 1);
-        ASSERT_TRUE(RingInOrder());
+        ASSERT_EQ(IsPlaying, 1) << "IsPlaying after the Play command";
+        ASSERT_TRUE(RingInOrder()) << "WriteSlot " << WriteSlot << ", DoneSlot " << DoneSlot << "; expected WriteSlot two ahead";
         const int32_t blockBefore = SynthState.BlockIndex;
         ASSERT_TRUE(PumpUntil([&] { return SynthState.BlockIndex >= blockBefore + 3; }, 5000))
             << "round " << round << ": the new stream did not go on";
@@ -293,9 +293,9 @@ TEST(Ring, PlayRightAfterStopIgnoresTheBuffersTheStopHandedBack) {
 
 TEST(Ring, ANotificationDuringAStreamErrorBoxWaitsAndTheRingStaysInOrder) {
     Command(PlayId);
-    ASSERT_EQ(IsPlaying, 1);
+    ASSERT_EQ(IsPlaying, 1) << "IsPlaying after the Play command";
     ASSERT_TRUE(PumpUntil([] { return DoneSlot == 1; }, 3000)) << "the first refill did not come";
-    ASSERT_TRUE(RingInOrder());
+    ASSERT_TRUE(RingInOrder()) << "WriteSlot " << WriteSlot << ", DoneSlot " << DoneSlot << "; expected WriteSlot two ahead";
     // The next release fails: its device handle is made invalid until the
     // watcher has seen a notification arrive while the failure's box is open.
     Watch = BoxLog();
@@ -309,8 +309,8 @@ TEST(Ring, ANotificationDuringAStreamErrorBoxWaitsAndTheRingStaysInOrder) {
     ASSERT_EQ(Watch.Texts.size(), 2u) << "stream boxes: " << Watch.Texts.size()
                                       << " (first \"" << (Watch.Texts.empty() ? "" : Watch.Texts[0])
                                       << "\"), expected exactly \"Error 4531\" and the device text";
-    EXPECT_EQ(Watch.Texts[0], "Error 4531");
-    EXPECT_EQ(Watch.Texts[1], deviceText);
+    EXPECT_EQ(Watch.Texts[0], "Error 4531") << "first stream box of the failed release";
+    EXPECT_EQ(Watch.Texts[1], deviceText) << "second box: waveOutGetErrorTextA(MMSYSERR_INVALHANDLE)";
     EXPECT_GE(Watch.HeldBack, 1) << "no notification arrived while the box was open: the case was not exercised";
     EXPECT_EQ(DeferredRefills, 0) << "held-back notifications were never handled";
     EXPECT_TRUE(RingInOrder()) << "after the box: WriteSlot " << WriteSlot << ", DoneSlot " << DoneSlot;
@@ -324,7 +324,7 @@ TEST(Ring, ANotificationDuringAStreamErrorBoxWaitsAndTheRingStaysInOrder) {
             << "slot " << WriteSlot << " is the next to be written but the device still has it";
     }
     Command(StopId);
-    EXPECT_EQ(IsPlaying, 0);
+    EXPECT_EQ(IsPlaying, 0) << "IsPlaying after the Stop command";
 }
 
 }  // namespace
