@@ -228,6 +228,57 @@ TEST(Ring, SlotsAreUsedInOrderAndStopStartsAgainAtSlot0) {
 
 }
 
+// Notifications reaching the window, by whether the chime was on when they
+// came: the test puts itself in front of the window procedure.
+struct DoneTally {
+    int32_t WhileChiming = 0;
+    int32_t AfterChime = 0;     // after the chime had ended
+    bool ChimeStarted = false;
+    WNDPROC Next = nullptr;
+};
+DoneTally Tally;
+
+LRESULT CALLBACK CountingProc(HWND window, UINT message, WPARAM wParam, LPARAM lParam) {
+    if (message == MM_WOM_DONE && Tally.ChimeStarted) {
+        if (IsChiming == 1)
+            ++Tally.WhileChiming;
+        else
+            ++Tally.AfterChime;
+    }
+    return CallWindowProcA(Tally.Next, window, message, wParam, lParam);
+}
+
+TEST(Ring, AChimeRightAfterStopCountsOnlyItsOwnBuffers) {
+    // The chime test handled right after Stop: the stop's handed-back
+    // buffers are still queued, and the chime's device may get the handle
+    // value the main device had. The chime must still play all its 32
+    // buffers: none of them is handed back by an early close.
+    Command(PlayId);
+    ASSERT_EQ(IsPlaying, 1) << "IsPlaying after the Play command";
+    ASSERT_TRUE(PumpUntil([] { return DoneSlot == 1; }, 3000)) << "no refill within 3 s";
+    const HWAVEOUT mainDevice = MainDevice;
+    Tally = DoneTally();
+    Tally.Next = reinterpret_cast<WNDPROC>(
+        SetWindowLongPtrA(MainWindow, GWLP_WNDPROC, reinterpret_cast<LONG_PTR>(CountingProc)));
+    Command(StopId);
+    Command(ChimeTestId);
+    Tally.ChimeStarted = true;
+    ASSERT_EQ(IsChiming, 1) << "IsChiming after the chime test command";
+    std::printf("main device %p, chime device %p\n", static_cast<void*>(mainDevice),
+                static_cast<void*>(ChimeDevice));
+    EXPECT_TRUE(PumpUntil([] { return IsChiming == 0; }, 15000)) << "the chime did not end within 15 s";
+    EXPECT_EQ(ChimeBuffersDone, 32) << "chime buffers counted";
+    // A chime closed early hands its last buffers back, each with a
+    // notification after the end; a chime played out has none left.
+    PumpUntil([] { return false; }, 1000);
+    SetWindowLongPtrA(MainWindow, GWLP_WNDPROC, reinterpret_cast<LONG_PTR>(Tally.Next));
+    EXPECT_EQ(Tally.AfterChime, 0) << Tally.AfterChime << " notifications came after the chime ended: it was "
+                                   << "closed before its last buffers had played";
+    EXPECT_EQ(Tally.WhileChiming, 32 + 2) << "notifications while the chime was on: expected the stop's 2 "
+                                             "handed-back buffers and the chime's 32";
+    EXPECT_EQ(HandedBack, 0) << "handed-back notifications still expected";
+}
+
 // What the box watcher saw and did.
 struct BoxLog {
     std::vector<std::string> Texts;   // every stream box, in order
