@@ -26,6 +26,8 @@ void ReportStreamError(const char* code, const char* caption, MMRESULT result) {
     }
 }
 
+}  // namespace
+
 void FillStreamFormat(WAVEFORMATEX* format) {
     format->wFormatTag = WAVE_FORMAT_PCM;
     format->nChannels = 2;
@@ -35,7 +37,6 @@ void FillStreamFormat(WAVEFORMATEX* format) {
     format->nAvgBytesPerSec = format->nBlockAlign * format->nSamplesPerSec;
     format->cbSize = 0;
 }
-}  // namespace
 
 bool StreamBoxIsOpen() { return StreamBoxesOpen > 0; }
 

@@ -10,6 +10,9 @@
 #include <cstdint>
 #include <windows.h>
 
+// The format of both devices: 48 000 Hz, 16-bit, two channels, PCM.
+void FillStreamFormat(WAVEFORMATEX* format);
+
 // Opens the device with `receiver` getting its notifications; slots to 0.
 // A failure is reported and the caller goes on as if it were open.
 void OpenStream(HWND receiver);

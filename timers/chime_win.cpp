@@ -9,6 +9,7 @@
 
 #include "app/core_state.h"
 #include "app/globals.h"
+#include "audio/stream.h"
 #include "engine/platform.h"
 #include "timers/chime.h"
 
@@ -35,17 +36,6 @@ void AbandonChime(bool opened) {
         if (ChimeHeaders[i].dwFlags & WHDR_PREPARED) waveOutUnprepareHeader(ChimeDevice, &ChimeHeaders[i], sizeof(WAVEHDR));
     waveOutClose(ChimeDevice);
 }
-
-void FillChimeFormat(WAVEFORMATEX* format) {
-    format->wFormatTag = WAVE_FORMAT_PCM;
-    format->nChannels = 2;
-    format->nSamplesPerSec = SampleRate;
-    format->wBitsPerSample = 16;
-    format->nBlockAlign = static_cast<WORD>(format->wBitsPerSample * format->nChannels / 8);
-    format->nAvgBytesPerSec = format->nBlockAlign * format->nSamplesPerSec;
-    format->cbSize = 0;
-}
-
 }  // namespace
 
 void StartChime() {
@@ -55,7 +45,7 @@ void StartChime() {
     // Several million sines: the window does not answer meanwhile.
     SynthState.ChimePeak = MakeChime(ControlSettings.Value[Attenuator]);
 
-    FillChimeFormat(&StreamFormat);
+    FillStreamFormat(&StreamFormat);
     MMRESULT result = waveOutOpen(&ChimeDevice, WAVE_MAPPER, &StreamFormat,
                                   reinterpret_cast<DWORD_PTR>(MainWindow), 0, CALLBACK_WINDOW);
     if (result != MMSYSERR_NOERROR) {
