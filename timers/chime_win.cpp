@@ -27,10 +27,15 @@ void ReportChimeError(const char* code, MMRESULT result) {
 }
 
 // After a failed call fewer than 32 done-messages would come and the chime
-// would never end, refusing Play for the rest of the run: end it now.
-void AbandonChime(bool opened) {
+// would never end, refusing Play for the rest of the run: end it now. The
+// written buffers whose done-messages were not counted yet (some may have
+// come while the error box was open) will still arrive; they are counted as
+// handed back, so that a Play made before they arrive does not take them for
+// its own.
+void AbandonChime(bool opened, int32_t written) {
     IsChiming = 0;
     if (!opened) return;
+    HandedBack += written - ChimeBuffersDone;
     waveOutReset(ChimeDevice);
     for (int32_t i = 0; i < ChimeBufferCount; ++i)
         if (ChimeHeaders[i].dwFlags & WHDR_PREPARED) waveOutUnprepareHeader(ChimeDevice, &ChimeHeaders[i], sizeof(WAVEHDR));
@@ -50,7 +55,7 @@ void StartChime() {
                                   reinterpret_cast<DWORD_PTR>(MainWindow), 0, CALLBACK_WINDOW);
     if (result != MMSYSERR_NOERROR) {
         ReportChimeError("Error 4558", result);
-        AbandonChime(false);
+        AbandonChime(false, 0);
         return;
     }
     // ChimePcm is the playback area itself: nothing rewrites it until the
@@ -65,13 +70,13 @@ void StartChime() {
         result = waveOutPrepareHeader(ChimeDevice, header, sizeof(WAVEHDR));
         if (result != MMSYSERR_NOERROR) {
             ReportChimeError("Error 4559", result);
-            AbandonChime(true);
+            AbandonChime(true, i);
             return;
         }
         result = waveOutWrite(ChimeDevice, header, sizeof(WAVEHDR));
         if (result != MMSYSERR_NOERROR) {
             ReportChimeError("Error 4560", result);
-            AbandonChime(true);
+            AbandonChime(true, i);
             return;
         }
     }
