@@ -2,7 +2,7 @@
 #include "app/controls.h"
 #include "app/core_state.h"
 #include "app/globals.h"
-#include "app/time_fields.h"
+#include "timers/time_fields.h"
 #include "audio/stream.h"
 #include "engine/block.h"
 #include "engine/platform.h"

@@ -4,7 +4,7 @@
 #include "app/controls.h"
 #include "app/core_state.h"
 #include "app/globals.h"
-#include "app/time_fields.h"
+#include "timers/time_fields.h"
 #include "engine/block.h"
 #include "settings/registry.h"
 #include "shaping/eq_window.h"

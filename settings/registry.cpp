@@ -2,7 +2,7 @@
 
 #include "app/core_state.h"
 #include "app/globals.h"
-#include "app/time_fields.h"
+#include "timers/time_fields.h"
 #include "settings/value_codec.h"
 
 namespace {

@@ -1,4 +1,4 @@
-#include "app/time_fields.h"
+#include "timers/time_fields.h"
 #include "app/core_state.h"
 #include "app/globals.h"
 #include "timers/time_text.h"

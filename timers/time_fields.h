@@ -1,4 +1,4 @@
-// app/time_fields.h: the stop-time, alarm and fade controls of the window.
+// timers/time_fields.h: the stop-time, alarm and fade controls of the window.
 //
 // The four edit fields hold free text until Play, which checks the fields of
 // the features that are on. FieldValid (app/globals.h) remembers which field
