@@ -64,8 +64,11 @@ render --out stop0.wav --stop-after 0 --blocks 10 && [ "$(u32 stop0.wav 40)" -eq
 render --out fo.wav --stop-after 2 --fade-out 1 && [ "$(u32 fo.wav 40)" -eq $((704 * 32768)) ] && ok || bad "--stop-after 2 --fade-out 1: blocks 0..703 expected"
 render --out fi.wav --blocks 4 --fade-in 1 && ! cmp -s fi.wav <(head -c $((44 + 4 * 32768)) d.wav | tail -c +1) && ok || bad "--fade-in changed nothing"
 
-# Across the wrap: block 524289 is made as block 0 (without the ramp).
+# Across the wrap: block 524289 is made as block 0 (without the ramp), so a
+# stop time counts from there.
 render --out w.wav --blocks 3 --start-index 524287 && ok || bad "--start-index 524287 failed"
+render --out w2.wav --stop-after 2 --start-index 524289 && [ "$(u32 w2.wav 40)" -eq $((704 * 32768)) ] && ok \
+  || bad "--stop-after 2 from index 524289 gave $(u32 w2.wav 40) bytes of data, expected $((704 * 32768))"
 
 # The curves file: a header and one row per bin.
 if render --out c.wav --blocks 1 --profile white --curves c.csv; then
@@ -111,6 +114,8 @@ expect_error --fade-in --out bad.wav --fade-in 16
 expect_error --fade-out --out bad.wav --fade-out 5
 expect_error --stop-after --out bad.wav --stop-after 1440
 expect_error --blocks --out bad.wav --blocks 0
+expect_error --seconds --out bad.wav --seconds 30000
+expect_error --stop-after --out bad.wav --stop-after 1439
 expect_error --seconds --out bad.wav --seconds -1
 expect_error --start-index --out bad.wav --start-index 524290
 expect_error --frobnicate --out bad.wav --frobnicate 3

@@ -58,7 +58,7 @@ struct Options {
     std::string Curves;
     std::string Chime;
     int64_t Blocks = 30;
-    bool BlocksGiven = false;
+    const char* LengthOption = nullptr;   // --blocks or --seconds, when given
     int32_t StartIndex = 0;
     bool Progress = false;
     bool StopAfterGiven = false;
@@ -180,13 +180,11 @@ bool WriteChime(const std::string& path) {
     return ok;
 }
 
-}  // namespace
-
-int main(int argc, char** argv) {
-    Options o;
-    SetControlStartValues(&ControlSettings);
+// Reads the options into *o and the control record. Returns -1 to go on,
+// or the exit status to end with (0 after --help, 2 after bad input).
+int ParseOptions(int argc, char** argv, Options* options) {
+    Options& o = *options;
     int32_t* v = ControlSettings.Value;
-
     for (int i = 1; i < argc; ++i) {
         const char* opt = argv[i];
         if (std::strcmp(opt, "--help") == 0) {
@@ -223,7 +221,7 @@ int main(int argc, char** argv) {
             if (!ParseInteger(val, 1, MaxRawBlocks, &n))
                 return Fail(opt, std::string("'") + val + "' is not a whole number of blocks from 1");
             o.Blocks = n;
-            o.BlocksGiven = true;
+            o.LengthOption = "--blocks";
         } else if (name == "--seconds") {
             char* end = nullptr;
             errno = 0;
@@ -235,7 +233,7 @@ int main(int argc, char** argv) {
             int64_t blocks = static_cast<int64_t>(exact);
             if (static_cast<double>(blocks) < exact) ++blocks;
             o.Blocks = blocks < 1 ? 1 : blocks;
-            o.BlocksGiven = true;
+            o.LengthOption = "--seconds";
         } else if (name == "--volume" || name == "--hardness" || name == "--bass" ||
                    name == "--sub-bass" || name == "--treble") {
             if (!ParseInteger(val, SliderMin, SliderMax, &n))
@@ -272,28 +270,12 @@ int main(int argc, char** argv) {
             o.StartIndex = static_cast<int32_t>(n);
         }
     }
-    if (!o.Chime.empty()) {
-        MakeChime(v[Attenuator]);
-        if (!WriteChime(o.Chime)) return Fail("--chime", "cannot write " + o.Chime);
-        if (o.Out.empty()) return 0;
-    }
-    if (o.Out.empty()) return Fail("--out", "is required (see --help)");
-    if (v[FadeOutOn] == 1 && !o.StopAfterGiven) return Fail("--fade-out", "needs --stop-after");
-    if (o.StopAfterGiven) {
-        // The stop time as the program holds it: minutes past the render's
-        // midnight clock, on a 24-hour dial (neither AM nor PM set).
-        v[PlayUntilOn] = 1;
-        v[Alarm_AM] = 0;
-        v[Alarm_PM] = 0;
-        v[Alarm_Hr] = o.StopAfter / 60;
-        v[Alarm_Min] = o.StopAfter % 60;
-        if (!o.BlocksGiven) o.Blocks = MaxRawBlocks;  // until the stop rule ends it
-    }
-    const bool raw = o.Out == "-";
-    if (!raw && o.BlocksGiven && o.Blocks > MaxWavBlocks)
-        return Fail(o.BlocksGiven ? "--blocks" : "--seconds",
-                    "a WAV file holds at most 131071 blocks (6.2 hours); use --out - for longer");
+    return -1;
+}
 
+// Renders the rain into o.Out (a WAV file, or raw PCM on standard output).
+int RenderRain(const Options& o) {
+    const bool raw = o.Out == "-";
     // Written under a temporary name and renamed at the end, so a failed
     // render leaves no partial file behind.
     const std::string partial = o.Out + ".partial";
@@ -327,11 +309,6 @@ int main(int argc, char** argv) {
             return Fail("--curves", "cannot write " + o.Curves);
         }
         if (RenderStopped) break;
-        if (!raw && written >= MaxWavBlocks) {
-            std::fclose(out);
-            std::remove(partial.c_str());
-            return Fail("--stop-after", "the render would pass 131071 blocks, the most a WAV file holds; use --out -");
-        }
         PutBlock(SynthState.PcmBlock, bytes);
         ok = std::fwrite(bytes, 1, sizeof bytes, out) == sizeof bytes;
         ++written;
@@ -358,4 +335,46 @@ int main(int argc, char** argv) {
     }
     if (!ok) return Fail("--out", "cannot write to standard output");
     return 0;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    Options o;
+    SetControlStartValues(&ControlSettings);
+    int32_t* v = ControlSettings.Value;
+    const int parsed = ParseOptions(argc, argv, &o);
+    if (parsed >= 0) return parsed;
+
+    if (!o.Chime.empty()) {
+        MakeChime(v[Attenuator]);
+        if (!WriteChime(o.Chime)) return Fail("--chime", "cannot write " + o.Chime);
+        if (o.Out.empty()) return 0;
+    }
+    if (o.Out.empty()) return Fail("--out", "is required (see --help)");
+    if (v[FadeOutOn] == 1 && !o.StopAfterGiven) return Fail("--fade-out", "needs --stop-after");
+    const char* lengthOption = o.LengthOption;
+    if (o.StopAfterGiven) {
+        // The stop time as the program holds it: minutes past the render's
+        // midnight clock, on a 24-hour dial (neither AM nor PM set).
+        v[PlayUntilOn] = 1;
+        v[Alarm_AM] = 0;
+        v[Alarm_PM] = 0;
+        v[Alarm_Hr] = o.StopAfter / 60;
+        v[Alarm_Min] = o.StopAfter % 60;
+        // The stop rule ends the render after the block whose index is
+        // floor(minutes * 351.5625), counting from the first block's index
+        // (an index past the cycle starts over at 0).
+        const int64_t first = o.StartIndex > LastBlockIndex ? 0 : o.StartIndex;
+        const int64_t untilStop = static_cast<int64_t>(o.StopAfter * 351.5625) + 1 - first;
+        const int64_t blocks = untilStop < 1 ? 0 : untilStop;
+        if (lengthOption == nullptr || blocks < o.Blocks) {
+            o.Blocks = blocks;
+            lengthOption = "--stop-after";
+        }
+    }
+    if (o.Out != "-" && o.Blocks > MaxWavBlocks)
+        return Fail(lengthOption ? lengthOption : "--blocks",
+                    "a WAV file holds at most 131071 blocks (6.2 hours); use --out - for longer");
+    return RenderRain(o);
 }
