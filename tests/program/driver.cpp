@@ -53,6 +53,20 @@ BOOL CALLBACK FindChild(HWND window, LPARAM data) {
     return TRUE;
 }
 
+struct SliderSearch {
+    int32_t Id;
+    HWND Found;
+};
+
+BOOL CALLBACK FindSlider(HWND window, LPARAM data) {
+    SliderSearch* search = reinterpret_cast<SliderSearch*>(data);
+    if (GetDlgCtrlID(window) == search->Id && _stricmp(ClassOf(window).c_str(), "ScrollBar") == 0) {
+        search->Found = window;
+        return FALSE;
+    }
+    return TRUE;
+}
+
 struct WindowTally {
     DWORD ProcessId;
     int32_t Count;
@@ -166,6 +180,14 @@ void EndProgram(Program* program) {
 
 HWND Control(const Program& program, int32_t id) { return GetDlgItem(program.Window, id); }
 
+HWND Slider(const Program& program, int32_t id) {
+    // The Volume slider's id is 0, which the labels and frames share, so
+    // GetDlgItem may answer with one of those: look for the scroll bar.
+    SliderSearch search = {id, nullptr};
+    EnumChildWindows(program.Window, FindSlider, reinterpret_cast<LPARAM>(&search));
+    return search.Found;
+}
+
 HWND ChildByText(const Program& program, const char* cls, const char* text) {
     ChildSearch search = {cls, text, nullptr};
     EnumChildWindows(program.Window, FindChild, reinterpret_cast<LPARAM>(&search));
@@ -225,7 +247,7 @@ void ClickAsync(const Program& program, int32_t id) {
 void Scroll(const Program& program, int32_t sliderId, int32_t code, int32_t position) {
     DWORD_PTR result = 0;
     SendMessageTimeoutA(program.Window, WM_HSCROLL, MAKEWPARAM(code, position),
-                        reinterpret_cast<LPARAM>(Control(program, sliderId)), SMTO_NORMAL, 10000,
+                        reinterpret_cast<LPARAM>(Slider(program, sliderId)), SMTO_NORMAL, 10000,
                         &result);
 }
 

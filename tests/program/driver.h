@@ -40,6 +40,8 @@ void EndProgram(Program* program);
 
 // Controls of the main window.
 HWND Control(const Program& program, int32_t id);
+// The slider (scroll bar) with control id 0..35.
+HWND Slider(const Program& program, int32_t id);
 // Finds a child by class and text (for the id-0 labels and frames).
 HWND ChildByText(const Program& program, const char* cls, const char* text);
 std::string ClassOf(HWND window);
