@@ -26,10 +26,12 @@ the runs are found wherever they are, not by comparing from frame 0.
             block at most two blocks after the next one the program makes;
   stop:     the settings include --stop-after, so the render ends where the
             program stops by itself: the sound is that render from its start,
-            at least 99 % of it after the first 200 ms, it goes on to the last
-            block the device had time to play, and silence follows;
-  alarm:    as stop, and then the chime (--chime at the same options), every
-            frame of it, then silence again.
+            at least 99 % of it after the first 200 ms; every block but the
+            last is heard whole, the last as far as the device played it
+            before the stop's reset cut it, and silence follows;
+  alarm:    as stop, and then the chime (--chime at the same options): at
+            least 99 % of its frames after its first 200 ms, in order, up to
+            its very last frame, then silence again.
 
 Usage: compare_recording.py CAPTURE.raw TIMELINE RENDER_TOOL
 Prints one line per check, "PASS name" or "FAIL name: why", and exits 1 on
