@@ -312,6 +312,16 @@ def check_changes(name, capture, begin, end, options, events, tool, results):
                         '(last run: render %d, frames %d..%d of %d)' % (ri, p, p + n, last)))
 
 
+def fragment_at(capture, first, last):
+    """The sound from frame `first` up to the next NEEDLE silent frames."""
+    zero = b'\0' * FRAME
+    f, quiet = first, 0
+    while f < last and quiet < NEEDLE:
+        quiet = quiet + 1 if capture[f * FRAME:(f + 1) * FRAME] == zero else 0
+        f += 1
+    return capture[first * FRAME:(f - quiet) * FRAME]
+
+
 def blocks(frames):
     return '1 block' if frames // BLOCK == 1 else '%d blocks' % (frames // BLOCK)
 
@@ -343,6 +353,16 @@ def check_stop(name, capture, begin, end, options, tool, results, chime=False):
     runs = match_runs(capture, first, last, renders)
     rain_runs = [r for r in runs if r[2] == 0]
     tune_runs = [r for r in runs if r[2] == 1]
+    if not rain_runs:
+        # The reset may leave the rain too few frames for the search of
+        # match_runs (a needle of NEEDLE frames): look for the sound up to
+        # the first silence in the render as it is.
+        fragment = fragment_at(capture, first, last)
+        at = rain.find(fragment) if fragment else -1
+        while at >= 0 and at % FRAME:
+            at = rain.find(fragment, at + 1)
+        if at >= 0:
+            rain_runs = [(first, len(fragment) // FRAME, 0, at // FRAME)]
     if rain_runs:
         start = rain_runs[0][0] - rain_runs[0][3]         # capture frame of render frame 0
         reached = max(p + n for p, n, _, _ in rain_runs)  # capture frame after the last rain frame heard
