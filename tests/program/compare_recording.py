@@ -381,7 +381,7 @@ def check_stop(name, capture, begin, end, options, tool, results, chime=False):
                           ('%d (%.2f s into the sound)' % (first_gap - start, (first_gap - start) / RATE))
                           if first_gap is not None else 'none'))
     elif need == 0:
-        reached = first
+        reached = begin                                   # no rain: anything but the chime is stray
         heard, share, backwards = 0, 1.0, []
         detail = ('the render %s has %s; the reset of the stop cut all of it'
                   % (' '.join(options), blocks(total)))
@@ -438,12 +438,13 @@ def check_stop(name, capture, begin, end, options, tool, results, chime=False):
     tjudged = tune_total - judged_from
     tlast = max(r + n for _, n, _, r in tune_runs)
     tbackwards = [(p, r) for (p, n, _, r), (_, pn, _, pr) in zip(tune_runs[1:], tune_runs) if r < pr + pn - 8]
-    tdetail = ('the chime starts %.3f s after the last frame of the rain; %d of its %d frames '
+    tdetail = (('the chime starts %.3f s after the last frame of the rain; ' % ((tune_start - reached) / RATE)
+                if heard else 'no rain was heard before the chime; ') +
+               ('%d of its %d frames '
                '(%.3f %%) equal the render tool\'s chime, %d of %d (%.3f %%) after its first 200 ms; first '
                'missing frame after them %s; its last frame heard is %d'
-               % ((tune_start - reached) / RATE, whole, tune_total, 100.0 * whole / tune_total, tmatched, tjudged,
-                  100.0 * tmatched / tjudged,
-                  ('%d (%.3f s into the chime)' % (tgap, tgap / RATE)) if tgap is not None else 'none', tlast - 1))
+               % (whole, tune_total, 100.0 * whole / tune_total, tmatched, tjudged, 100.0 * tmatched / tjudged,
+                  ('%d (%.3f s into the chime)' % (tgap, tgap / RATE)) if tgap is not None else 'none', tlast - 1)))
     if tune_start < reached:
         results.append(('FAIL', cname, tdetail + ': it starts before the rain stopped'))
     elif tmatched < 0.99 * tjudged:
