@@ -1,4 +1,5 @@
 #include "tests/program/driver.h"
+#include "tests/program/window_ids.h"
 #include <winternl.h>
 #include <cstdio>
 #include <cstring>
@@ -405,4 +406,16 @@ int64_t FileSize(const std::string& path) {
     WIN32_FILE_ATTRIBUTE_DATA data;
     if (!GetFileAttributesExA(path.c_str(), GetFileExInfoStandard, &data)) return -1;
     return (static_cast<int64_t>(data.nFileSizeHigh) << 32) | data.nFileSizeLow;
+}
+
+bool ShowsPlaying(const Program& program) {
+    for (int32_t id : DisabledWhilePlaying)
+        if (IsWindowEnabled(Control(program, id))) return false;
+    return true;
+}
+
+bool ShowsStopped(const Program& program) {
+    for (int32_t id : DisabledWhilePlaying)
+        if (id != FadeOutId && id != FadeOutFieldId && !IsWindowEnabled(Control(program, id))) return false;
+    return true;
 }

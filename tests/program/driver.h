@@ -42,6 +42,11 @@ void EndProgram(Program* program);
 HWND Control(const Program& program, int32_t id);
 // The slider (scroll bar) with control id 0..35.
 HWND Slider(const Program& program, int32_t id);
+// The playing state as the controls show it: every control Play disables is
+// disabled. The stopped state: all of them enabled but the Fade Out pair,
+// which follows Stop Time and Alarm.
+bool ShowsPlaying(const Program& program);
+bool ShowsStopped(const Program& program);
 // Finds a child by class and text (for the id-0 labels and frames).
 HWND ChildByText(const Program& program, const char* cls, const char* text);
 std::string ClassOf(HWND window);

@@ -10,24 +10,10 @@
 #include <set>
 #include <string>
 #include "tests/program/driver.h"
+#include "tests/program/window_ids.h"
 #include "tests/program/settings_store.h"
 
 namespace {
-
-// Ids, as the window uses them.
-constexpr int32_t PlayId = 1030, StopId = 1031, ChimeTestId = 1029, AlarmId = 1032;
-constexpr int32_t HourId = 1033, MinuteId = 1034, AmId = 1035, PmId = 1036;
-constexpr int32_t StopTimeId = 1038, FadeInId = 1039, FadeOutId = 1040;
-constexpr int32_t FadeInFieldId = 1041, FadeOutFieldId = 1042, HelpId = 1051;
-constexpr int32_t EqPanelId = 1055, EqLockId = 1057, EqCloseId = 1069;
-constexpr int32_t WhiteId = 1043, TalkingId = 1047, DogsId = 1049, TrafficId = 1050;
-constexpr int32_t VolumeId = 0;
-
-// What Play disables, in its order; Stop enables them again, the Fade Out
-// pair only while Stop Time or Alarm is on.
-const int32_t DisabledWhilePlaying[] = {StopTimeId, HourId,        MinuteId,  AmId,
-                                        PmId,       AlarmId,       FadeInFieldId, FadeInId,
-                                        FadeOutFieldId, FadeOutId, ChimeTestId};
 
 struct Expected {
     const char* Class;
@@ -166,17 +152,9 @@ protected:
     }
     HWND C(int32_t id) { return Control(P, id); }
     bool Enabled(int32_t id) { return IsWindowEnabled(C(id)) != FALSE; }
-    bool Playing() {
-        for (int32_t id : DisabledWhilePlaying)
-            if (Enabled(id)) return false;
-        return true;
-    }
+    bool Playing() { return ShowsPlaying(P); }
     // Everything but the Fade Out pair enabled: the stopped state.
-    bool Stopped() {
-        for (int32_t id : DisabledWhilePlaying)
-            if (id != FadeOutId && id != FadeOutFieldId && !Enabled(id)) return false;
-        return true;
-    }
+    bool Stopped() { return ShowsStopped(P); }
     void ExpectNoBox(const char* after) {
         std::vector<Box> boxes = OpenBoxes(P);
         EXPECT_TRUE(boxes.empty()) << after << ": a box is open, caption \""

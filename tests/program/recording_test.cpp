@@ -21,24 +21,12 @@
 #include <vector>
 
 #include "tests/program/driver.h"
+#include "tests/program/window_ids.h"
 #include "tests/program/settings_store.h"
 
 namespace {
 
-// Ids, as the window uses them.
-constexpr int32_t PlayId = 1030, StopId = 1031, ChimeTestId = 1029, AlarmId = 1032;
-constexpr int32_t HourId = 1033, MinuteId = 1034, AmId = 1035, PmId = 1036;
-constexpr int32_t StopTimeId = 1038, FadeInId = 1039, FadeOutId = 1040;
-constexpr int32_t FadeInFieldId = 1041, FadeOutFieldId = 1042;
-constexpr int32_t EqPanelId = 1055, EqLockId = 1057, M1Id = 1065;
-constexpr int32_t VolumeId = 0, FirstBandId = 5;
 constexpr int32_t BandCount = 31;
-
-// What Play disables; Stop (or the stop time) enables all of them again but
-// the Fade Out pair, which follows Stop Time and Alarm.
-const int32_t DisabledWhilePlaying[] = {StopTimeId, HourId,        MinuteId,  AmId,
-                                        PmId,       AlarmId,       FadeInFieldId, FadeInId,
-                                        FadeOutFieldId, FadeOutId, ChimeTestId};
 
 // The chime lasts 262 144 frames at 48 000 Hz.
 constexpr double ChimeSeconds = 262144.0 / 48000.0;
@@ -104,16 +92,8 @@ protected:
     // frames, so it is found as the scroll bar with that id.
     HWND C(int32_t id) { return id == VolumeId ? Slider(P, id) : Control(P, id); }
     bool Enabled(int32_t id) { return IsWindowEnabled(C(id)) != FALSE; }
-    bool Playing() {
-        for (int32_t id : DisabledWhilePlaying)
-            if (Enabled(id)) return false;
-        return true;
-    }
-    bool Stopped() {
-        for (int32_t id : DisabledWhilePlaying)
-            if (id != FadeOutId && id != FadeOutFieldId && !Enabled(id)) return false;
-        return true;
-    }
+    bool Playing() { return ShowsPlaying(P); }
+    bool Stopped() { return ShowsStopped(P); }
     void ExpectNoBox(const char* after) {
         std::vector<Box> boxes = OpenBoxes(P);
         EXPECT_TRUE(boxes.empty()) << after << ": a box is open, caption \""

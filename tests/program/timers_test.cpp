@@ -11,18 +11,10 @@
 #include <string>
 #include <vector>
 #include "tests/program/driver.h"
+#include "tests/program/window_ids.h"
 #include "tests/program/settings_store.h"
 
 namespace {
-
-constexpr int32_t PlayId = 1030, StopId = 1031, ChimeTestId = 1029, AlarmId = 1032;
-constexpr int32_t HourId = 1033, MinuteId = 1034, AmId = 1035, PmId = 1036;
-constexpr int32_t StopTimeId = 1038, FadeInId = 1039, FadeOutId = 1040;
-constexpr int32_t FadeInFieldId = 1041, FadeOutFieldId = 1042;
-
-// The controls Play disables and Stop enables again.
-const int32_t TimerControls[] = {StopTimeId, HourId,         MinuteId,  AmId,       PmId,       AlarmId,
-                                 FadeInFieldId, FadeInId, FadeOutFieldId, FadeOutId, ChimeTestId};
 
 const uint32_t Red = Rgb(255, 0, 0);
 const uint32_t White = Rgb(255, 255, 255);
@@ -70,16 +62,8 @@ protected:
     }
     int32_t FocusId() { return Focus() ? GetDlgCtrlID(Focus()) : 0; }
     // Every timer control enabled but the Fade Out pair, which follows its rule.
-    bool Stopped() {
-        for (int32_t id : TimerControls)
-            if (id != FadeOutId && id != FadeOutFieldId && !Enabled(id)) return false;
-        return true;
-    }
-    bool Playing() {
-        for (int32_t id : TimerControls)
-            if (Enabled(id)) return false;
-        return true;
-    }
+    bool Stopped() { return ShowsStopped(P); }
+    bool Playing() { return ShowsPlaying(P); }
     void ExpectNoBox(const char* after) {
         ASSERT_TRUE(Settle(P)) << after << ": SendMessageTimeout(WM_NULL) timed out; expected the program back in its message loop";
         std::vector<Box> boxes = OpenBoxes(P);
@@ -262,9 +246,9 @@ TEST_F(TimeFields, TextsAreCutToTheirNumberAndShownAsIt) {
 
 // ---------------------------------------------------------------- the controls
 
-class TimerControlsTest : public TimersTest {};
+class DisabledWhilePlayingTest : public TimersTest {};
 
-TEST_F(TimerControlsTest, FadeOutFollowsStopTimeAndAlarmAndKeepsItsCheckMark) {
+TEST_F(DisabledWhilePlayingTest, FadeOutFollowsStopTimeAndAlarmAndKeepsItsCheckMark) {
     EXPECT_FALSE(Enabled(FadeOutId)) << "\"Fade Out\" enabled at first start with Stop Time and Alarm off";
     Press(StopTimeId);
     ASSERT_TRUE(Enabled(FadeOutId)) << "\"Fade Out\" still disabled after checking \"Stop Time\"";
@@ -293,24 +277,24 @@ TEST_F(TimerControlsTest, FadeOutFollowsStopTimeAndAlarmAndKeepsItsCheckMark) {
     }
 }
 
-TEST_F(TimerControlsTest, AllAreDisabledWhilePlayingAndEnabledAfterStop) {
+TEST_F(DisabledWhilePlayingTest, AllAreDisabledWhilePlayingAndEnabledAfterStop) {
     Press(AlarmId);
     SetDistantStopTime();
     Press(FadeInId);
     Press(FadeOutId);
     Type(FadeInFieldId, "5");
     Type(FadeOutFieldId, "5");
-    for (int32_t id : TimerControls)
+    for (int32_t id : DisabledWhilePlaying)
         ASSERT_TRUE(Enabled(id)) << "before Play control " << id << " is disabled";
     Press(PlayId);
     ExpectNoBox("Play with Alarm, Fade In and Fade Out on");
-    for (int32_t id : TimerControls)
+    for (int32_t id : DisabledWhilePlaying)
         EXPECT_FALSE(Enabled(id)) << "while playing IsWindowEnabled(control " << id << ") gave 1, expected 0";
     for (int32_t id : {AlarmId, FadeInId, FadeOutId})
         EXPECT_TRUE(IsChecked(C(id))) << "while playing BM_GETCHECK of " << id << " gave 0, expected 1";
     Press(StopId);
     // Alarm is on, so the Fade Out pair comes back with the others.
-    for (int32_t id : TimerControls)
+    for (int32_t id : DisabledWhilePlaying)
         EXPECT_TRUE(Enabled(id)) << "after Stop IsWindowEnabled(control " << id << ") gave 0, expected 1";
     Press(AlarmId);
     Press(PlayId);

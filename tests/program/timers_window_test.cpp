@@ -11,26 +11,9 @@
 #include "app/globals.h"
 #include "app/ids.h"
 #include "app/window.h"
+#include "tests/program/in_process.h"
 
 namespace {
-
-// Runs this thread's messages until `condition` holds or `ms` have passed.
-template <typename F>
-bool PumpUntil(F condition, DWORD ms) {
-    const ULONGLONG end = GetTickCount64() + ms;
-    for (;;) {
-        MSG message;
-        while (PeekMessageA(&message, nullptr, 0, 0, PM_REMOVE)) {
-            TranslateMessage(&message);
-            DispatchMessageA(&message);
-        }
-        if (condition()) return true;
-        if (GetTickCount64() >= end) return false;
-        MsgWaitForMultipleObjects(0, nullptr, FALSE, 10, QS_ALLINPUT);
-    }
-}
-
-void Command(int32_t id) { SendMessageA(MainWindow, WM_COMMAND, MAKEWPARAM(id, BN_CLICKED), 0); }
 
 // Checks or unchecks a check box as a click would, and tells the window.
 void SetBox(HWND box, int32_t id, bool on) {
@@ -62,21 +45,10 @@ struct BoxSeen {
 };
 std::vector<BoxSeen> Seen;
 
-BOOL CALLBACK FindOwnBox(HWND window, LPARAM data) {
-    char cls[32] = {0};
-    GetClassNameA(window, cls, sizeof(cls));
-    if (std::string(cls) == "#32770" && IsWindowVisible(window)) {
-        *reinterpret_cast<HWND*>(data) = window;
-        return FALSE;
-    }
-    return TRUE;
-}
-
 // A thread timer, dispatched also by a box's own modal loop: notes and
 // answers every box, so no box holds the test.
 void CALLBACK AnswerBoxes(HWND, UINT, UINT_PTR, DWORD) {
-    HWND box = nullptr;
-    EnumThreadWindows(GetCurrentThreadId(), FindOwnBox, reinterpret_cast<LPARAM>(&box));
+    HWND box = OwnOpenBox();
     if (box == nullptr) return;
     char text[400] = {0};
     GetDlgItemTextA(box, 0xFFFF, text, sizeof(text));

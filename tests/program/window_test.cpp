@@ -13,28 +13,11 @@
 #include "app/globals.h"
 #include "app/meter.h"
 #include "app/window.h"
+#include "tests/program/in_process.h"
 #include "audio/stream.h"
 #include "engine/platform.h"
 
 namespace {
-
-// Runs this thread's messages until `condition` holds or `ms` have passed.
-template <typename F>
-bool PumpUntil(F condition, DWORD ms) {
-    const ULONGLONG end = GetTickCount64() + ms;
-    for (;;) {
-        MSG message;
-        while (PeekMessageA(&message, nullptr, 0, 0, PM_REMOVE)) {
-            TranslateMessage(&message);
-            DispatchMessageA(&message);
-        }
-        if (condition()) return true;
-        if (GetTickCount64() >= end) return false;
-        MsgWaitForMultipleObjects(0, nullptr, FALSE, 10, QS_ALLINPUT);
-    }
-}
-
-void Command(int32_t id) { SendMessageA(MainWindow, WM_COMMAND, MAKEWPARAM(id, BN_CLICKED), 0); }
 
 void Scroll(int32_t id, int32_t code, int32_t position = 0) {
     SendMessageA(MainWindow, WM_HSCROLL, MAKEWPARAM(code, position),
@@ -288,22 +271,11 @@ struct BoxLog {
 };
 BoxLog Watch;
 
-BOOL CALLBACK FindOwnBox(HWND window, LPARAM data) {
-    char cls[32] = {0};
-    GetClassNameA(window, cls, sizeof(cls));
-    if (std::string(cls) == "#32770" && IsWindowVisible(window)) {
-        *reinterpret_cast<HWND*>(data) = window;
-        return FALSE;
-    }
-    return TRUE;
-}
-
 // A thread timer: the box's own modal loop dispatches it. The code box is
 // held open until a buffer-done notification has arrived behind it (or 5 s
 // have passed), then the real device is put back and the box answered.
 void CALLBACK WatchBoxes(HWND, UINT, UINT_PTR, DWORD) {
-    HWND box = nullptr;
-    EnumThreadWindows(GetCurrentThreadId(), FindOwnBox, reinterpret_cast<LPARAM>(&box));
+    HWND box = OwnOpenBox();
     if (box == nullptr) return;
     char text[400] = {0};
     GetDlgItemTextA(box, 0xFFFF, text, sizeof(text));
