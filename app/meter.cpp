@@ -50,6 +50,19 @@ void UpdatePeaks(const float* right, const float* left) {
     InvalidateRect(MainWindow, &MeterState.Frame, TRUE);
 }
 
+namespace {
+// One bar inside its area, one pixel in from its edges, as long as the peak
+// says: blue up to the overload level, red above it.
+void PaintBar(HDC dc, const RECT& area, int32_t width, int32_t peak, HBRUSH normal, HBRUSH overload,
+              RECT* bar) {
+    bar->left = area.left + 1;
+    bar->top = area.top + 1;
+    bar->bottom = area.bottom - 1;
+    bar->right = MeterBarRight(&area, width, peak);
+    FillRect(dc, bar, peak > MeterOverload ? overload : normal);
+}
+}  // namespace
+
 void PaintMeter(HWND window, MeterRecord* meter) {
     meter->PaintDc = BeginPaint(window, &meter->Paint);
     // Any repaint while nothing plays (covering, uncovering) shows empty bars.
@@ -57,23 +70,12 @@ void PaintMeter(HWND window, MeterRecord* meter) {
         meter->PeakLeft = 0;
         meter->PeakRight = 0;
     }
+    // Both bars scale by the upper area's width (the lower one's is the same).
     const int32_t width = meter->UpperArea.right - meter->UpperArea.left;
-
-    RECT& up = meter->UpperBar;
-    up.left = meter->UpperArea.left + 1;
-    up.top = meter->UpperArea.top + 1;
-    up.bottom = meter->UpperArea.bottom - 1;
-    up.right = MeterBarRight(&meter->UpperArea, width, meter->PeakRight);
-    FillRect(meter->PaintDc, &up,
-            meter->PeakRight > MeterOverload ? meter->UpperOverload : meter->UpperNormal);
-
-    RECT& low = meter->LowerBar;
-    low.left = meter->LowerArea.left + 1;
-    low.top = meter->LowerArea.top + 1;
-    low.bottom = meter->LowerArea.bottom - 1;
-    low.right = MeterBarRight(&meter->LowerArea, width, meter->PeakLeft);
-    FillRect(meter->PaintDc, &low,
-            meter->PeakLeft > MeterOverload ? meter->LowerOverload : meter->LowerNormal);
+    PaintBar(meter->PaintDc, meter->UpperArea, width, meter->PeakRight, meter->UpperNormal,
+             meter->UpperOverload, &meter->UpperBar);
+    PaintBar(meter->PaintDc, meter->LowerArea, width, meter->PeakLeft, meter->LowerNormal,
+             meter->LowerOverload, &meter->LowerBar);
 
     EndPaint(window, &meter->Paint);
 }

