@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 #include "tests/program/driver.h"
+#include "tests/program/program_fixture.h"
 #include "tests/program/window_ids.h"
 #include "tests/program/settings_store.h"
 
@@ -25,22 +26,10 @@ std::string Hex(uint32_t pixel) {
     return text;
 }
 
-// A fresh program per test, on its first start; boxes it left open are
-// answered before it is closed.
-class TimersTest : public ::testing::Test {
+// The program fixture with what the timer tests add: pressing, typing and
+// the focus.
+class TimersTest : public ProgramTest {
 protected:
-    Program P = {};
-    void SetUp() override {
-        ASSERT_TRUE(ForgetStoredSettings()) << "the key HKLM\\Software\\Sombrel could not be removed";
-        ASSERT_TRUE(LaunchProgram(&P)) << "LaunchProgram(" << Config.ProgramPath
-                                       << ") found no visible window of class \"Sombrel Player\" within 30 s";
-    }
-    void TearDown() override {
-        AnswerAllBoxes(0);
-        if (CloseProgram(&P) < 0) EndProgram(&P);
-    }
-    HWND C(int32_t id) { return Control(P, id); }
-    bool Enabled(int32_t id) { return IsWindowEnabled(C(id)) != FALSE; }
     void Press(int32_t id) {
         ASSERT_TRUE(Click(P, id)) << "SendMessageTimeout(BM_CLICK) to control " << id
                                   << " timed out; expected the click handled";
@@ -61,15 +50,6 @@ protected:
         return info.hwndFocus;
     }
     int32_t FocusId() { return Focus() ? GetDlgCtrlID(Focus()) : 0; }
-    // Every timer control enabled but the Fade Out pair, which follows its rule.
-    bool Stopped() { return ShowsStopped(P); }
-    bool Playing() { return ShowsPlaying(P); }
-    void ExpectNoBox(const char* after) {
-        ASSERT_TRUE(Settle(P)) << after << ": SendMessageTimeout(WM_NULL) timed out; expected the program back in its message loop";
-        std::vector<Box> boxes = OpenBoxes(P);
-        EXPECT_TRUE(boxes.empty()) << after << ": a box is open, caption \"" << (boxes.empty() ? "" : boxes[0].Caption)
-                                   << "\", text \"" << (boxes.empty() ? "" : boxes[0].Text) << "\"; expected none";
-    }
     // Answers every box until none has come for `quietMs`; returns their texts.
     std::vector<std::string> AnswerAllBoxes(DWORD quietMs = 1500) {
         std::vector<std::string> texts;
