@@ -21,7 +21,8 @@ TEST(TimeText, FourCharactersAreConvertedAndTruncated) {
         int32_t Value;
     };
     const Case cases[] = {{"77x", 77}, {".", 0},     {"12x", 12},  {"123", 123}, {"1.5", 1},  {"0", 0},
-                          {"16", 16},  {"15", 15},   {"12345", 1234}, {"9.99", 9}, {"1e3", 1000}, {"59", 59}};
+                          {"16", 16},  {"15", 15},   {"12345", 1234}, {"9.99", 9}, {"59", 59},
+                          {"12e1", 12}, {"55e9", 55}, {".5e1", 0}, {"9999", 9999}};
     for (const Case& c : cases)
         EXPECT_EQ(TimeTextValue(c.Text), c.Value) << "TimeTextValue(\"" << c.Text << "\")";
 }

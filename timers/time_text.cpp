@@ -1,7 +1,5 @@
 #include "timers/time_text.h"
 
-#include <cstdlib>
-
 bool CheckTimeText(const char* text) {
     if (text[0] == '\0') return false;
     for (int32_t i = 0; i < 2 && text[i] != '\0'; ++i) {
@@ -12,7 +10,12 @@ bool CheckTimeText(const char* text) {
 }
 
 int32_t TimeTextValue(const char* text) {
-    char head[5] = {0, 0, 0, 0, 0};
-    for (int32_t i = 0; i < 4 && text[i] != '\0'; ++i) head[i] = text[i];
-    return static_cast<int32_t>(std::atof(head));
+    // Leading digits, then an optional full stop and fraction: the fraction
+    // is cut off by the truncation, so only the digits before the first other
+    // character count. An exponent is not part of the number: "12e1" is 12.
+    // At most four digits are read, so the value stays within 0..9999.
+    int32_t value = 0;
+    for (int32_t i = 0; i < 4 && text[i] >= '0' && text[i] <= '9'; ++i)
+        value = value * 10 + (text[i] - '0');
+    return value;
 }

@@ -7,7 +7,8 @@
 // first two characters (all it has, if fewer) are digits or full stops.
 bool CheckTimeText(const char* text);
 
-// The value Play stores for a field's text: its first four characters
-// converted as a decimal number (atof: digits, an optional full stop and
-// fraction, stopping at the first other character), truncated toward zero.
+// The value Play stores for a field's text: its first four characters read
+// as a decimal number (digits, an optional full stop and fraction, stopping
+// at the first other character, an exponent's "e" included), truncated
+// toward zero. Always 0..9999.
 int32_t TimeTextValue(const char* text);
