@@ -43,8 +43,12 @@ int32_t MeterBarRight(const RECT* area, int32_t width, int32_t peak) {
 }
 
 // The block processor's report, once per block: each channel's largest
-// magnitude before clipping, so a peak may exceed 32000.
+// magnitude before clipping, so a peak may exceed 32000. The meter shows
+// only blocks that are queued: a block during which the stop time stopped
+// the stream is never played, and while the alarm chime follows it the
+// paint would keep its bars on screen to the chime's end.
 void UpdatePeaks(const float* right, const float* left) {
+    if (IsPlaying != 1) return;
     MeterState.PeakRight = PeakMagnitude(right, BlockFrames);
     MeterState.PeakLeft = PeakMagnitude(left, BlockFrames);
     InvalidateRect(MainWindow, &MeterState.Frame, TRUE);

@@ -14,7 +14,8 @@ void StopPlayback();
 void StartChime();
 
 // Each block's right and left channel, 8192 floats each, after the gain stage
-// and before clipping: the level meter takes its peaks from them.
+// and before clipping: the level meter takes its peaks from them, unless the
+// block stopped the stream (it is never played).
 void UpdatePeaks(const float* right, const float* left);
 
 // The local wall clock, hour 0..23 and minute 0..59; read once when Play

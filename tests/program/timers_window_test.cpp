@@ -205,6 +205,27 @@ TEST(ChimeTest, PressedAgainAndPlayDuringTheChimeChangeNothingAndWorkAfterIt) {
     EXPECT_EQ(ChimeBuffersDone, 32) << "buffers counted for the second chime";
 }
 
+TEST(ChimeTest, TheAlarmStopsTheRainAndTheMeterShowsNoBlockThatWasNotPlayed) {
+    ClearTimers();
+    SYSTEMTIME now;
+    GetLocalTime(&now);
+    if (now.wSecond >= 58) {  // not across a minute's turn
+        Sleep(3000);
+        GetLocalTime(&now);
+    }
+    SetWindowTextA(HourField, std::to_string(now.wHour % 12 == 0 ? 12 : now.wHour % 12).c_str());
+    SetWindowTextA(MinuteField, std::to_string(now.wMinute).c_str());
+    Command(now.wHour < 12 ? AmId : PmId);
+    SetBox(AlarmBox, AlarmId, true);
+    Command(PlayId);  // the stop time is now: the second priming block stops the rain
+    ASSERT_EQ(IsChiming, 1) << "IsChiming after Play at the alarm time (IsPlaying " << int(IsPlaying) << ")";
+    PumpUntil([] { return IsChiming == 0; }, 1000);  // repaints while the chime plays
+    EXPECT_EQ(MeterState.PeakLeft, 0) << "left peak while the chime plays: the stopping block was never played";
+    EXPECT_EQ(MeterState.PeakRight, 0) << "right peak while the chime plays";
+    EXPECT_TRUE(PumpUntil([] { return IsChiming == 0; }, 20000)) << "the alarm chime did not end within 20 s";
+    ClearTimers();
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
