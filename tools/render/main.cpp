@@ -17,103 +17,14 @@
 #include "engine/block.h"
 #include "timers/chime.h"
 #include "timers/timer_gains.h"
+#include "tools/render/options.h"
 #include "tools/render/render.h"
 
 namespace {
 
-const char UsageText[] =
-    "usage: sombrel-render --out FILE [options]\n"
-    "Renders the rain exactly as the program plays it, from block 0\n"
-    "(8192 frames, 170.67 ms each), as a 48 kHz 16-bit stereo WAV file.\n"
-    "\n"
-    "  --out FILE          output file; - writes raw PCM to standard output\n"
-    "  --blocks N          blocks to render (default 30)\n"
-    "  --seconds S         seconds to render, rounded up to whole blocks\n"
-    "  --volume V          Volume slider, 1..255 (default 128)\n"
-    "  --hardness V        Hardness slider, 1..255 (default 128)\n"
-    "  --bass V            Bass slider, 1..255 (default 128)\n"
-    "  --sub-bass V        Sub Bass slider, 1..255 (default 128)\n"
-    "  --treble V          Treble slider, 1..255 (default 128)\n"
-    "  --profile P         100..107 or white, pink, red, brown, talking,\n"
-    "                      music, traffic, dogs (default 104, talking)\n"
-    "  --eq V0,...,V30     the 31 equaliser band sliders, 1..255, lowest band\n"
-    "                      first; 1 is +20 dB, 128 flat, 255 -20 dB\n"
-    "  --fade-in M         fade in over M minutes, 1..15\n"
-    "  --fade-out M        fade out over the M minutes before the stop, 1..15\n"
-    "                      (needs --stop-after)\n"
-    "  --stop-after M      stop time M minutes after Play, 0..1439; the render\n"
-    "                      ends where playback stops\n"
-    "  --start-index N     block index of the first block, 0..524289\n"
-    "  --curves FILE.csv   write the response curves after the first block\n"
-    "  --chime FILE.wav    write the alarm chime at --volume (5.461 s); with\n"
-    "                      it, --out may be left out\n"
-    "  --progress          show progress on standard error\n"
-    "  --help              show this text\n";
-
-constexpr int32_t MaxWavBlocks = 131071;        // keeps the RIFF sizes below 4 GiB
-constexpr int64_t MaxRawBlocks = 1000000000;    // a limit only against typing mistakes
-
-struct Options {
-    std::string Out;
-    std::string Curves;
-    std::string Chime;
-    int64_t Blocks = 30;
-    const char* LengthOption = nullptr;   // --blocks or --seconds, when given
-    int32_t StartIndex = 0;
-    bool Progress = false;
-    bool StopAfterGiven = false;
-    int32_t StopAfter = 0;
-};
-
 int Fail(const char* option, const std::string& why) {
     std::fprintf(stderr, "sombrel-render: %s: %s\n", option, why.c_str());
     return 2;
-}
-
-// Whole decimal number within [low, high]; false for anything else.
-bool ParseInteger(const char* text, int64_t low, int64_t high, int64_t* value) {
-    if (*text == '\0') return false;
-    const char* p = text;
-    if (*p == '-' || *p == '+') ++p;
-    if (*p == '\0') return false;
-    for (const char* q = p; *q; ++q)
-        if (*q < '0' || *q > '9') return false;
-    if (std::strlen(p) > 12) return false;
-    const long long v = std::strtoll(text, nullptr, 10);
-    if (v < low || v > high) return false;
-    *value = v;
-    return true;
-}
-
-bool ParseProfile(const char* text, int32_t* profile) {
-    static const char* const names[] = {"white", "pink",  "red",     "brown",
-                                        "talking", "music", "traffic", "dogs"};
-    for (int32_t i = 0; i < 8; ++i) {
-        if (std::strcmp(text, names[i]) == 0) {
-            *profile = ProfileWhite + i;
-            return true;
-        }
-    }
-    int64_t v = 0;
-    if (!ParseInteger(text, ProfileWhite, ProfileDogs, &v)) return false;
-    *profile = static_cast<int32_t>(v);
-    return true;
-}
-
-bool ParseBands(const char* text, ControlRecord* settings) {
-    std::string list(text);
-    size_t start = 0;
-    for (int32_t band = 0; band < EqBandCount; ++band) {
-        const size_t comma = list.find(',', start);
-        const bool last = band == EqBandCount - 1;
-        if (last != (comma == std::string::npos)) return false;
-        const std::string item = list.substr(start, last ? std::string::npos : comma - start);
-        int64_t v = 0;
-        if (!ParseInteger(item.c_str(), SliderMin, SliderMax, &v)) return false;
-        settings->Value[EqBandFirst + band] = static_cast<int32_t>(v);
-        start = comma + 1;
-    }
-    return true;
 }
 
 void PutU32(unsigned char* p, uint32_t v) {
@@ -180,101 +91,8 @@ bool WriteChime(const std::string& path) {
     return ok;
 }
 
-// Reads the options into *o and the control record. Returns -1 to go on,
-// or the exit status to end with (0 after --help, 2 after bad input).
-int ParseOptions(int argc, char** argv, Options* options) {
-    Options& o = *options;
-    int32_t* v = ControlSettings.Value;
-    for (int i = 1; i < argc; ++i) {
-        const char* opt = argv[i];
-        if (std::strcmp(opt, "--help") == 0) {
-            std::fputs(UsageText, stdout);
-            return 0;
-        }
-        if (std::strcmp(opt, "--progress") == 0) {
-            o.Progress = true;
-            continue;
-        }
-        if (std::strncmp(opt, "--", 2) != 0)
-            return Fail(opt, "unexpected argument (options start with --; see --help)");
-        static const char* const withValue[] = {
-            "--out", "--blocks", "--seconds", "--volume", "--hardness", "--bass", "--sub-bass",
-            "--treble", "--profile", "--eq", "--fade-in", "--fade-out", "--stop-after",
-            "--start-index", "--curves", "--chime"};
-        bool known = false;
-        for (const char* name : withValue) known = known || std::strcmp(opt, name) == 0;
-        if (!known) return Fail(opt, "unknown option (see --help)");
-        if (i + 1 >= argc) return Fail(opt, "needs a value");
-        const char* val = argv[++i];
-        const std::string name(opt);
-        int64_t n = 0;
-        if (name == "--out") {
-            if (*val == '\0') return Fail(opt, "needs a file name");
-            o.Out = val;
-        } else if (name == "--chime") {
-            if (*val == '\0') return Fail(opt, "needs a file name");
-            o.Chime = val;
-        } else if (name == "--curves") {
-            if (*val == '\0') return Fail(opt, "needs a file name");
-            o.Curves = val;
-        } else if (name == "--blocks") {
-            if (!ParseInteger(val, 1, MaxRawBlocks, &n))
-                return Fail(opt, std::string("'") + val + "' is not a whole number of blocks from 1");
-            o.Blocks = n;
-            o.LengthOption = "--blocks";
-        } else if (name == "--seconds") {
-            char* end = nullptr;
-            errno = 0;
-            const double seconds = std::strtod(val, &end);
-            if (*val == '\0' || *end != '\0' || errno != 0 || !(seconds > 0.0) || seconds > 1e8)
-                return Fail(opt, std::string("'") + val + "' is not a number of seconds above 0");
-            // Whole blocks, rounded up: a block is 8192 / 48000 s.
-            const double exact = seconds * SampleRate / BlockFrames;
-            int64_t blocks = static_cast<int64_t>(exact);
-            if (static_cast<double>(blocks) < exact) ++blocks;
-            o.Blocks = blocks < 1 ? 1 : blocks;
-            o.LengthOption = "--seconds";
-        } else if (name == "--volume" || name == "--hardness" || name == "--bass" ||
-                   name == "--sub-bass" || name == "--treble") {
-            if (!ParseInteger(val, SliderMin, SliderMax, &n))
-                return Fail(opt, std::string("'") + val + "' is not a slider value 1..255");
-            const ControlField field = name == "--volume"     ? Attenuator
-                                       : name == "--hardness" ? Hardness
-                                       : name == "--bass"     ? Bass
-                                       : name == "--sub-bass" ? SubBass
-                                                              : Treble;
-            v[field] = static_cast<int32_t>(n);
-        } else if (name == "--profile") {
-            if (!ParseProfile(val, &v[Profile]))
-                return Fail(opt, std::string("'") + val +
-                                     "' is not a profile (100..107, white, pink, red, brown, "
-                                     "talking, music, traffic, dogs)");
-        } else if (name == "--eq") {
-            if (!ParseBands(val, &ControlSettings))
-                return Fail(opt, "expects 31 comma-separated band values 1..255");
-        } else if (name == "--fade-in") {
-            if (!ParseInteger(val, 1, 15, &n)) return Fail(opt, std::string("'") + val + "' is not 1..15 minutes");
-            v[FadeInOn] = 1;
-            v[FadeInTime] = static_cast<int32_t>(n);
-        } else if (name == "--fade-out") {
-            if (!ParseInteger(val, 1, 15, &n)) return Fail(opt, std::string("'") + val + "' is not 1..15 minutes");
-            v[FadeOutOn] = 1;
-            v[FadeOutTime] = static_cast<int32_t>(n);
-        } else if (name == "--stop-after") {
-            if (!ParseInteger(val, 0, 1439, &n)) return Fail(opt, std::string("'") + val + "' is not 0..1439 minutes");
-            o.StopAfterGiven = true;
-            o.StopAfter = static_cast<int32_t>(n);
-        } else if (name == "--start-index") {
-            if (!ParseInteger(val, 0, LastBlockIndex + 1, &n))
-                return Fail(opt, std::string("'") + val + "' is not a block index 0..524289");
-            o.StartIndex = static_cast<int32_t>(n);
-        }
-    }
-    return -1;
-}
-
 // Renders the rain into o.Out (a WAV file, or raw PCM on standard output).
-int RenderRain(const Options& o) {
+int RenderRain(const RenderOptions& o) {
     const bool raw = o.Out == "-";
     // Written under a temporary name and renamed at the end, so a failed
     // render leaves no partial file behind.
@@ -340,41 +158,21 @@ int RenderRain(const Options& o) {
 }  // namespace
 
 int main(int argc, char** argv) {
-    Options o;
+    RenderOptions o;
     SetControlStartValues(&ControlSettings);
-    int32_t* v = ControlSettings.Value;
-    const int parsed = ParseOptions(argc, argv, &o);
-    if (parsed >= 0) return parsed;
-
+    std::string error;
+    if (!ParseRenderOptions(argc, argv, &o, &ControlSettings, &error)) {
+        std::fprintf(stderr, "sombrel-render: %s\n", error.c_str());
+        return 2;
+    }
+    if (o.Help) {
+        std::fputs(RenderUsage, stdout);
+        return 0;
+    }
     if (!o.Chime.empty()) {
-        MakeChime(v[Attenuator]);
+        MakeChime(ControlSettings.Value[Attenuator]);
         if (!WriteChime(o.Chime)) return Fail("--chime", "cannot write " + o.Chime);
-        if (o.Out.empty()) return 0;
     }
-    if (o.Out.empty()) return Fail("--out", "is required (see --help)");
-    if (v[FadeOutOn] == 1 && !o.StopAfterGiven) return Fail("--fade-out", "needs --stop-after");
-    const char* lengthOption = o.LengthOption;
-    if (o.StopAfterGiven) {
-        // The stop time as the program holds it: minutes past the render's
-        // midnight clock, on a 24-hour dial (neither AM nor PM set).
-        v[PlayUntilOn] = 1;
-        v[Alarm_AM] = 0;
-        v[Alarm_PM] = 0;
-        v[Alarm_Hr] = o.StopAfter / 60;
-        v[Alarm_Min] = o.StopAfter % 60;
-        // The stop rule ends the render after the block whose index is
-        // floor(minutes * 351.5625), counting from the first block's index
-        // (an index past the cycle starts over at 0).
-        const int64_t first = o.StartIndex > LastBlockIndex ? 0 : o.StartIndex;
-        const int64_t untilStop = static_cast<int64_t>(o.StopAfter * 351.5625) + 1 - first;
-        const int64_t blocks = untilStop < 1 ? 0 : untilStop;
-        if (lengthOption == nullptr || blocks < o.Blocks) {
-            o.Blocks = blocks;
-            lengthOption = "--stop-after";
-        }
-    }
-    if (o.Out != "-" && o.Blocks > MaxWavBlocks)
-        return Fail(lengthOption ? lengthOption : "--blocks",
-                    "a WAV file holds at most 131071 blocks (6.2 hours); use --out - for longer");
+    if (o.Out.empty()) return 0;
     return RenderRain(o);
 }
