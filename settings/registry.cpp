@@ -70,8 +70,46 @@ void ShowLoadedValues() {
     SetCheck(FadeInBox, ControlSettings.Value[FadeInOn]);
     SetCheck(FadeOutBox, ControlSettings.Value[FadeOutOn]);
 }
+
+// Writes the 109 values to "Software\Sombrel" below `hive`, all of them even
+// after a failure. 0 when every step worked, else the code of the first
+// step that failed: 8735 the hive could not be opened for creating keys,
+// 8734 the key not created or opened, 8736 a value not written, 8737 the key
+// and 8738 the hive not closed.
+int32_t WriteSettingsKey(HKEY hive) {
+    HKEY root = nullptr;
+    if (RegOpenKeyExA(hive, nullptr, 0, KEY_CREATE_SUB_KEY, &root) != ERROR_SUCCESS) return 8735;
+    int32_t failed = 0;
+    HKEY key = nullptr;
+    DWORD disposition = 0;
+    if (RegCreateKeyExA(root, SettingsKeyName, 0, nullptr, REG_OPTION_NON_VOLATILE, KEY_WRITE, nullptr,
+                        &key, &disposition) != ERROR_SUCCESS) {
+        failed = 8734;
+    } else {
+        for (int32_t i = 0; i < StoredValueCount; ++i) {
+            uint8_t data[4];
+            EncodeStoredNumber(StoredNumberOf(i, &ControlSettings, EqMemories), data);
+            if (RegSetValueExA(key, StoredValueAt(i).Name, 0, REG_DWORD, data, sizeof(data)) != ERROR_SUCCESS &&
+                failed == 0)
+                failed = 8736;
+        }
+        if (RegCloseKey(key) != ERROR_SUCCESS && failed == 0) failed = 8737;
+    }
+    if (RegCloseKey(root) != ERROR_SUCCESS && failed == 0) failed = 8738;
+    return failed;
+}
 }  // namespace
 
+// Where the settings are kept. The machine's key is the first choice, as it
+// always was. A standard user (and an administrator without elevation) may
+// not write below HKEY_LOCAL_MACHINE, and a 64-bit program gets no registry
+// virtualization, so every save would fail with a box and every setting be
+// lost; such a user's settings go to the same key below HKEY_CURRENT_USER.
+//
+// Which key a start reads: the per-user key when it exists, else the
+// machine's. A per-user key exists only after a save that could not write
+// the machine's key, and a save that can write it removes the per-user key,
+// so whichever key a user's last save took is the one read at the next start.
 void LoadSettings() {
     if (SettingsLoaded == 1) return;
     // Stored values go into the controls, so the load waits for the last of
@@ -80,7 +118,8 @@ void LoadSettings() {
     SettingsLoaded = 1;  // before trying: a failed load is not repeated
 
     HKEY key = nullptr;
-    if (RegOpenKeyExA(HKEY_LOCAL_MACHINE, SettingsKeyName, 0, KEY_QUERY_VALUE, &key) != ERROR_SUCCESS)
+    if (RegOpenKeyExA(HKEY_CURRENT_USER, SettingsKeyName, 0, KEY_QUERY_VALUE, &key) != ERROR_SUCCESS &&
+        RegOpenKeyExA(HKEY_LOCAL_MACHINE, SettingsKeyName, 0, KEY_QUERY_VALUE, &key) != ERROR_SUCCESS)
         return;  // first start: the start values stay, silently
     for (int32_t i = 0; i < StoredValueCount; ++i) LoadValue(key, i);
     if (RegCloseKey(key) != ERROR_SUCCESS) RegistryError(8736);
@@ -94,26 +133,14 @@ void LoadSettings() {
 
 void SaveSettings() {
     if (HasPlayed != 1) return;
-    HKEY root = nullptr;
-    if (RegOpenKeyExA(HKEY_LOCAL_MACHINE, nullptr, 0, KEY_CREATE_SUB_KEY, &root) != ERROR_SUCCESS) {
-        // Nothing can be written: one box, not one per value.
-        RegistryError(8735);
+    const int32_t machine = WriteSettingsKey(HKEY_LOCAL_MACHINE);
+    if (machine == 0) {
+        // This user's older copy would win at the next start: it goes.
+        RegDeleteKeyA(HKEY_CURRENT_USER, SettingsKeyName);
         return;
     }
-    HKEY key = nullptr;
-    DWORD disposition = 0;
-    if (RegCreateKeyExA(root, SettingsKeyName, 0, nullptr, REG_OPTION_NON_VOLATILE, KEY_WRITE,
-                        nullptr, &key, &disposition) != ERROR_SUCCESS) {
-        RegistryError(8734);
-    } else {
-        for (int32_t i = 0; i < StoredValueCount; ++i) {
-            uint8_t data[4];
-            EncodeStoredNumber(StoredNumberOf(i, &ControlSettings, EqMemories), data);
-            if (RegSetValueExA(key, StoredValueAt(i).Name, 0, REG_DWORD, data, sizeof(data)) !=
-                ERROR_SUCCESS)
-                RegistryError(8736);
-        }
-        if (RegCloseKey(key) != ERROR_SUCCESS) RegistryError(8737);
-    }
-    if (RegCloseKey(root) != ERROR_SUCCESS) RegistryError(8738);
+    // Nothing is said while the user's own key takes the settings; one box
+    // when it cannot either.
+    const int32_t user = WriteSettingsKey(HKEY_CURRENT_USER);
+    if (user != 0) RegistryError(user);
 }

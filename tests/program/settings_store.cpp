@@ -7,10 +7,10 @@
 namespace {
 const char KeyName[] = "Software\\Sombrel";
 
-void OpenUp() {
+void OpenUp(HKEY hive) {
     // An empty access list still lets the owner change it.
     HKEY key = nullptr;
-    if (RegOpenKeyExA(HKEY_LOCAL_MACHINE, KeyName, 0, WRITE_DAC, &key) != ERROR_SUCCESS) return;
+    if (RegOpenKeyExA(hive, KeyName, 0, WRITE_DAC, &key) != ERROR_SUCCESS) return;
     SECURITY_DESCRIPTOR sd;
     InitializeSecurityDescriptor(&sd, SECURITY_DESCRIPTOR_REVISION);
     SetSecurityDescriptorDacl(&sd, TRUE, nullptr, FALSE);  // no list: everyone may
@@ -19,26 +19,28 @@ void OpenUp() {
 }
 }  // namespace
 
-bool SettingsKeyExists() {
+bool SettingsKeyExists(HKEY hive) {
     HKEY key = nullptr;
-    if (RegOpenKeyExA(HKEY_LOCAL_MACHINE, KeyName, 0, KEY_QUERY_VALUE, &key) != ERROR_SUCCESS) {
+    if (RegOpenKeyExA(hive, KeyName, 0, KEY_QUERY_VALUE, &key) != ERROR_SUCCESS) {
         // A denied key exists too.
-        if (RegOpenKeyExA(HKEY_LOCAL_MACHINE, KeyName, 0, WRITE_DAC, &key) != ERROR_SUCCESS) return false;
+        if (RegOpenKeyExA(hive, KeyName, 0, WRITE_DAC, &key) != ERROR_SUCCESS) return false;
     }
     RegCloseKey(key);
     return true;
 }
 
 bool ForgetStoredSettings() {
-    OpenUp();
-    RegDeleteKeyA(HKEY_LOCAL_MACHINE, KeyName);
-    return !SettingsKeyExists();
+    for (HKEY hive : {HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER}) {
+        OpenUp(hive);
+        RegDeleteKeyA(hive, KeyName);
+    }
+    return !SettingsKeyExists(HKEY_LOCAL_MACHINE) && !SettingsKeyExists(HKEY_CURRENT_USER);
 }
 
-bool StoreRaw(const char* name, DWORD type, const void* data, DWORD length) {
+bool StoreRaw(const char* name, DWORD type, const void* data, DWORD length, HKEY hive) {
     HKEY key = nullptr;
     DWORD disposition = 0;
-    if (RegCreateKeyExA(HKEY_LOCAL_MACHINE, KeyName, 0, nullptr, 0, KEY_WRITE, nullptr, &key,
+    if (RegCreateKeyExA(hive, KeyName, 0, nullptr, 0, KEY_WRITE, nullptr, &key,
                         &disposition) != ERROR_SUCCESS)
         return false;
     const LONG r = RegSetValueExA(key, name, 0, type, static_cast<const BYTE*>(data), length);
@@ -46,18 +48,18 @@ bool StoreRaw(const char* name, DWORD type, const void* data, DWORD length) {
     return r == ERROR_SUCCESS;
 }
 
-bool StoreNumber(const char* name, int32_t number) {
+bool StoreNumber(const char* name, int32_t number, HKEY hive) {
     char text[16] = {};
     std::snprintf(text, sizeof(text), "%d", number);
     uint8_t data[4] = {};
     for (int i = 0; i < 4; ++i) data[i] = static_cast<uint8_t>(text[i]);
-    return StoreRaw(name, REG_DWORD, data, 4);
+    return StoreRaw(name, REG_DWORD, data, 4, hive);
 }
 
-RawValue ReadRaw(const char* name) {
+RawValue ReadRaw(const char* name, HKEY hive) {
     RawValue value = {false, REG_NONE, {}};
     HKEY key = nullptr;
-    if (RegOpenKeyExA(HKEY_LOCAL_MACHINE, KeyName, 0, KEY_QUERY_VALUE, &key) != ERROR_SUCCESS)
+    if (RegOpenKeyExA(hive, KeyName, 0, KEY_QUERY_VALUE, &key) != ERROR_SUCCESS)
         return value;
     uint8_t data[256];
     DWORD length = sizeof(data);
@@ -69,8 +71,8 @@ RawValue ReadRaw(const char* name) {
     return value;
 }
 
-int32_t ReadNumber(const char* name, int32_t fallback) {
-    const RawValue value = ReadRaw(name);
+int32_t ReadNumber(const char* name, int32_t fallback, HKEY hive) {
+    const RawValue value = ReadRaw(name, hive);
     if (!value.Found || value.Type != REG_DWORD || value.Bytes.size() != 4) return fallback;
     char text[5] = {};
     for (int i = 0; i < 4 && value.Bytes[i] != 0; ++i) text[i] = static_cast<char>(value.Bytes[i]);
@@ -93,10 +95,10 @@ std::vector<std::string> StoredNames() {
     return names;
 }
 
-bool DenySettingsKey() {
+bool DenySettingsKey(HKEY hive) {
     HKEY key = nullptr;
     DWORD disposition = 0;
-    if (RegCreateKeyExA(HKEY_LOCAL_MACHINE, KeyName, 0, nullptr, 0, KEY_ALL_ACCESS, nullptr, &key,
+    if (RegCreateKeyExA(hive, KeyName, 0, nullptr, 0, KEY_ALL_ACCESS, nullptr, &key,
                         &disposition) != ERROR_SUCCESS)
         return false;
     SECURITY_DESCRIPTOR sd;

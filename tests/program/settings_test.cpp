@@ -299,8 +299,40 @@ TEST_F(Settings, TimeFieldsComeBackAsStoredForPlayToCheck) {
     EXPECT_EQ("", TextOf(C(FadeInFieldId))) << "fade-in field with FadeInTime stored as REG_SZ";
 }
 
-TEST_F(Settings, AKeyThatCannotBeCreatedIsReportedOnce) {
-    ASSERT_TRUE(DenySettingsKey()) << "the key could not be given an empty access list";
+TEST_F(Settings, AUserWhoMayNotWriteTheMachineKeyKeepsSettingsInTheirOwnKey) {
+    // Which key a start reads: the per-user key when there is one.
+    const struct { int32_t Machine, User, Shown; } loads[] = {{0, 0, 128}, {50, 0, 50}, {0, 60, 60}, {50, 60, 60}};
+    for (const auto& l : loads) {
+        ASSERT_TRUE(ForgetStoredSettings());
+        ASSERT_TRUE(!l.Machine || StoreNumber("Attenuator", l.Machine, HKEY_LOCAL_MACHINE));
+        ASSERT_TRUE(!l.User || StoreNumber("Attenuator", l.User, HKEY_CURRENT_USER));
+        Launch();
+        EXPECT_EQ(l.Shown, SliderPosition(C(0))) << "volume at start with the machine's key at " << l.Machine
+                                                 << " and the user's at " << l.User << " (0: no key)";
+        Close();
+    }
+    // A save to the machine's key removes the user's older copy.
+    Launch();
+    PlayOnce();
+    Close();
+    EXPECT_FALSE(SettingsKeyExists(HKEY_CURRENT_USER)) << "HKCU\\Software\\Sombrel left after a save to HKLM";
+    EXPECT_EQ(60, ReadNumber("Attenuator")) << "HKLM \"Attenuator\" after the save";
+    // The machine's key refuses writing: the user's own key takes the save, silently.
+    ASSERT_TRUE(DenySettingsKey(HKEY_LOCAL_MACHINE)) << "the key could not be given an empty access list";
+    Launch();
+    DWORD_PTR result = 0;
+    SendMessageTimeoutA(P.Window, WM_HSCROLL, MAKEWPARAM(SB_THUMBPOSITION, 200), reinterpret_cast<LPARAM>(C(0)),
+                        SMTO_NORMAL, 10000, &result);
+    PlayOnce();
+    Close();  // a box would hold the program: it must end by itself with 0
+    EXPECT_EQ(200, ReadNumber("Attenuator", -1, HKEY_CURRENT_USER)) << "HKCU \"Attenuator\" after the save";
+    Launch();
+    EXPECT_EQ(200, SliderPosition(C(0))) << "volume at the next start";
+}
+
+TEST_F(Settings, KeysThatCannotBeCreatedAreReportedOnce) {
+    ASSERT_TRUE(DenySettingsKey(HKEY_LOCAL_MACHINE)) << "the machine's key could not be given an empty access list";
+    ASSERT_TRUE(DenySettingsKey(HKEY_CURRENT_USER)) << "the user's key could not be given an empty access list";
     Launch();
     ExpectNoBox("start with a key that cannot be read");
     EXPECT_FALSE(IsChecked(C(EqLockId))) << "\"EQ Lock\" checked although the key could not be opened";
@@ -319,7 +351,7 @@ TEST_F(Settings, AKeyThatCannotBeCreatedIsReportedOnce) {
         return WaitForSingleObject(P.Process.hProcess, 0) == WAIT_OBJECT_0;
     }, 60000);
     EXPECT_TRUE(ended) << "the program did not end within 60 s after WM_CLOSE, " << texts.size() << " boxes answered";
-    ASSERT_EQ(1u, texts.size()) << "boxes at exit with a key that cannot be created; the first was \""
+    ASSERT_EQ(1u, texts.size()) << "boxes at exit with keys that cannot be created; the first was \""
                                 << (texts.empty() ? "" : texts[0]) << "\"";
     EXPECT_EQ("Registry Creation Error 8734", texts[0]) << "text of the box at exit";
     DWORD code = 99;
