@@ -89,6 +89,12 @@ else
   bad "--chime failed: $(cat err.txt)"
 fi
 
+# Something that is not a regular file is written to, never replaced.
+if [ -z "$native" ]; then
+  mkfifo pipe && { timeout 20 cat pipe > piped.wav & } && render --chime pipe --volume 255 && wait && [ -p pipe ] && cmp -s piped.wav ch.wav \
+    && ok || bad "--chime into a named pipe: the pipe was replaced or the chime differs"
+fi
+
 # Bad input: exit status 2, a one-line message naming the option, no file.
 expect_error() {
   local option=$1; shift

@@ -7,6 +7,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <string>
+#include <sys/stat.h>
 
 #ifdef _WIN32
 #include <fcntl.h>
@@ -69,10 +70,34 @@ bool WriteCurves(const char* path, const SynthRecord* s) {
     return std::fclose(f) == 0;
 }
 
-// The chime as the program queues it, written whole under a temporary name.
+// A file is written under a temporary name and put in place at the end, so
+// a failed write leaves no partial file behind. Something under the name
+// that is not a regular file (/dev/null, a pipe, Windows' NUL) is written to
+// directly: removing it or renaming over it would destroy it.
+FILE* OpenOutput(const std::string& path, std::string* partial) {
+    struct stat st;
+    const bool special = stat(path.c_str(), &st) == 0 && !S_ISREG(st.st_mode);
+    *partial = special ? "" : path + ".partial";
+    return std::fopen(special ? path.c_str() : partial->c_str(), "wb");
+}
+
+// Closes the output and, when everything was written, puts it in place;
+// otherwise removes what was written under the temporary name.
+bool FinishOutput(FILE* f, const std::string& path, const std::string& partial, bool ok) {
+    ok = (std::fclose(f) == 0) && ok;
+    if (partial.empty()) return ok;
+    if (ok) {
+        std::remove(path.c_str());  // rename does not replace a file on Windows
+        ok = std::rename(partial.c_str(), path.c_str()) == 0;
+    }
+    if (!ok) std::remove(partial.c_str());
+    return ok;
+}
+
+// The chime as the program queues it.
 bool WriteChime(const std::string& path) {
-    const std::string partial = path + ".partial";
-    FILE* f = std::fopen(partial.c_str(), "wb");
+    std::string partial;
+    FILE* f = OpenOutput(path, &partial);
     if (!f) return false;
     static unsigned char bytes[ChimeBufferFrames * 4];
     unsigned char header[44];
@@ -82,21 +107,13 @@ bool WriteChime(const std::string& path) {
         PutBlock(ChimePcm + 2 * ChimeBufferFrames * b, bytes);
         ok = std::fwrite(bytes, 1, sizeof bytes, f) == sizeof bytes;
     }
-    ok = (std::fclose(f) == 0) && ok;
-    if (ok) {
-        std::remove(path.c_str());  // rename does not replace a file on Windows
-        ok = std::rename(partial.c_str(), path.c_str()) == 0;
-    }
-    if (!ok) std::remove(partial.c_str());
-    return ok;
+    return FinishOutput(f, path, partial, ok);
 }
 
 // Renders the rain into o.Out (a WAV file, or raw PCM on standard output).
 int RenderRain(const RenderOptions& o) {
     const bool raw = o.Out == "-";
-    // Written under a temporary name and renamed at the end, so a failed
-    // render leaves no partial file behind.
-    const std::string partial = o.Out + ".partial";
+    std::string partial;
     FILE* out = nullptr;
     if (raw) {
 #ifdef _WIN32
@@ -104,7 +121,7 @@ int RenderRain(const RenderOptions& o) {
 #endif
         out = stdout;
     } else {
-        out = std::fopen(partial.c_str(), "wb");
+        out = OpenOutput(o.Out, &partial);
         if (!out) return Fail("--out", std::string("cannot write ") + o.Out + ": " + std::strerror(errno));
     }
     unsigned char header[44] = {};
@@ -120,10 +137,7 @@ int RenderRain(const RenderOptions& o) {
     for (int64_t b = 0; b < o.Blocks && ok; ++b) {
         ProcessBlock(&ControlSettings, &CachedSettings, &SynthState);
         if (b == 0 && !o.Curves.empty() && !WriteCurves(o.Curves.c_str(), &SynthState)) {
-            if (!raw) {
-                std::fclose(out);
-                std::remove(partial.c_str());
-            }
+            if (!raw) FinishOutput(out, o.Out, partial, false);
             return Fail("--curves", "cannot write " + o.Curves);
         }
         if (RenderStopped) break;
@@ -140,17 +154,7 @@ int RenderRain(const RenderOptions& o) {
         ok = std::fseek(out, 0, SEEK_SET) == 0 && std::fwrite(header, 1, sizeof header, out) == sizeof header;
     }
     ok = (std::fflush(out) == 0) && ok;
-    if (!raw) {
-        ok = (std::fclose(out) == 0) && ok;
-        if (ok) {
-            std::remove(o.Out.c_str());  // rename does not replace a file on Windows
-            ok = std::rename(partial.c_str(), o.Out.c_str()) == 0;
-        }
-        if (!ok) {
-            std::remove(partial.c_str());
-            return Fail("--out", "cannot write " + o.Out);
-        }
-    }
+    if (!raw && !FinishOutput(out, o.Out, partial, ok)) return Fail("--out", "cannot write " + o.Out);
     if (!ok) return Fail("--out", "cannot write to standard output");
     return 0;
 }
