@@ -37,8 +37,13 @@ const char RenderUsage[] =
 
 namespace {
 
+// The message quotes what was typed; a control character in it (a newline
+// passed inside an argument) would break the message's one line, so it is
+// shown as "?".
 bool Fail(std::string* error, const char* option, const std::string& why) {
     *error = std::string(option) + ": " + why;
+    for (char& c : *error)
+        if (static_cast<unsigned char>(c) < 0x20 || c == 0x7F) c = '?';
     return false;
 }
 

@@ -25,7 +25,7 @@ extern const char RenderUsage[];
 // Reads argv[1..argc-1] into *options and *settings (which the caller has
 // set to the control start values). On bad input returns false with *error
 // set to one line naming the option ("--volume: '0' is not a slider value
-// 1..255"); nothing has been written then. On success every setting lies in
+// 1..255"); the caller then writes no file. On success every setting lies in
 // its control's range, a stop time is set as the program holds it (a 24-hour
 // time past the render's midnight clock) and Blocks ends where it stops.
 bool ParseRenderOptions(int argc, const char* const* argv, RenderOptions* options,
