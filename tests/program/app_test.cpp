@@ -680,6 +680,7 @@ TEST_F(App, StoredSettingsComeBackOnceIntoTheControlsAndAreStoredBackByteForByte
     EXPECT_EQ(Thumb(Attenuator), 99) << "the stored settings were applied again at a later WM_SIZE";
     Scroll(Attenuator, SB_THUMBPOSITION, Distinct(0));
 
+    Press(EqDefeatId);  // the bands flat: a save writes the memories, not the bands
     ASSERT_TRUE(ForgetStoredSettings());
     HasPlayed = 0;
     SaveSettings();
