@@ -2,9 +2,12 @@
 // code, the settings written at the end of a run with Play and read at the
 // next start, and Help opening the manual that lies beside the program.
 // Usage: launch_tests SOMBREL.EXE [gtest options]; scripts/test also runs it
-// on the program unpacked from the release zip.
+// on the program unpacked from the release zip. With --figures SOMBREL.EXE
+// SECONDS it starts the program and plays it for scripts/measure-program.
 #include <gtest/gtest.h>
 #include <windows.h>
+#include <cstdio>
+#include <cstdlib>
 #include <fstream>
 #include <string>
 #include "tests/program/harness.h"
@@ -67,6 +70,17 @@ int main(int argc, char** argv) {
     if (argc == 4 && std::string(argv[1]) == "--mark-opened") {  // the shell opening a manual
         std::ofstream(argv[2]) << argv[3] << '\n';
         return 0;
+    }
+    if (argc == 4 && std::string(argv[1]) == "--figures") {  // for scripts/measure-program
+        Program p;
+        const ULONGLONG start = GetTickCount64();
+        if (!Launch(&p, WindowsPath(argv[2]))) return 1;
+        std::printf("time-to-window-ms %llu\n", GetTickCount64() - start);
+        if (!Click(p, 1030)) return 1;
+        std::printf("playing-pid %lu\n", p.Process.dwProcessId);
+        std::fflush(stdout);
+        Sleep(static_cast<DWORD>(std::atof(argv[3]) * 1000));
+        return Click(p, 1031) && Close(&p) == 0 ? 0 : 1;
     }
     ::testing::InitGoogleTest(&argc, argv);
     if (argc < 2) return std::fprintf(stderr, "usage: launch_tests SOMBREL.EXE [gtest options]\n"), 2;
