@@ -413,19 +413,23 @@ protected:
     Program P = {};
     std::string Dir;
     std::string Marker;
-    // A copy of the program in its own directory, with or without a manual.
-    // The shell opens .pdf files with this driver in its marker mode, which
-    // writes the opened path into Marker.
+    // A copy of the program in its own directory, with or without a manual;
+    // a program that already has its manual beside it (a release unpacked)
+    // is run where it lies. The shell opens .pdf files with this driver in
+    // its marker mode, which writes the opened path into Marker.
     void Prepare(const char* name, bool withManual) {
-        Dir = Config.WorkDir + "\\" + name;
+        const std::string home = Config.ProgramPath.substr(0, Config.ProgramPath.rfind('\\'));
+        const bool release =
+            withManual && GetFileAttributesA((home + "\\Sombrel.pdf").c_str()) != INVALID_FILE_ATTRIBUTES;
+        Dir = release ? home : Config.WorkDir + "\\" + name;
         Marker = Config.WorkDir + "\\" + name + "-opened.txt";
-        CreateDirectoryA(Dir.c_str(), nullptr);
         DeleteFileA(Marker.c_str());
-        ASSERT_TRUE(CopyFileA(Config.ProgramPath.c_str(), (Dir + "\\Sombrel.exe").c_str(), FALSE))
-            << "CopyFileA to " << Dir << " failed, error " << GetLastError();
-        DeleteFileA((Dir + "\\Sombrel.pdf").c_str());
-        if (withManual) {
-            std::ofstream((Dir + "\\Sombrel.pdf").c_str()) << "%PDF-1.4\n";
+        if (!release) {
+            CreateDirectoryA(Dir.c_str(), nullptr);
+            ASSERT_TRUE(CopyFileA(Config.ProgramPath.c_str(), (Dir + "\\Sombrel.exe").c_str(), FALSE))
+                << "CopyFileA to " << Dir << " failed, error " << GetLastError();
+            DeleteFileA((Dir + "\\Sombrel.pdf").c_str());
+            if (withManual) std::ofstream((Dir + "\\Sombrel.pdf").c_str()) << "%PDF-1.4\n";
         }
         char self[MAX_PATH];
         GetModuleFileNameA(nullptr, self, sizeof(self));
@@ -474,6 +478,10 @@ TEST_F(Help, AboutBoxComesFirstAndTheManualOpensAfterIt) {
     std::string opened;
     std::getline(marker, opened);
     EXPECT_EQ(Lower(opened), Lower(Dir + "\\Sombrel.pdf")) << "the shell opened \"" << opened << "\"";
+    // After Help the program plays, stops and ends cleanly.
+    ASSERT_TRUE(Click(P, PlayId) && ShowsPlaying(P)) << "Play after Help did not reach the playing state";
+    ASSERT_TRUE(Click(P, StopId) && ShowsStopped(P)) << "Stop did not bring the stopped state back";
+    EXPECT_EQ(CloseProgram(&P), 0) << "exit code after Help, Play, Stop and closing";
 }
 
 TEST_F(Help, WithoutTheManualTheProgramShowsNothingOfItsOwn) {
