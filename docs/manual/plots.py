@@ -8,8 +8,9 @@ profiles (white.csv ... dogs.csv, all other controls in the middle), the
 example equaliser setting (equaliser.csv, with example-eq.txt beside this
 file) and the tone controls at both ends (bass-1.csv ... treble-255.csv).
 Writes into OUT-DIR: profile-NAME.png for each profile, profiles.png (all
-eight, for the README), equaliser.png and tone.png. The same curves give the
-same PNG bytes (no software or date stamp in the files).
+eight; the README shows a copy, docs/profiles.png), equaliser.png and
+tone.png. The same curves give the same PNG bytes (no software or date
+stamp in the files).
 """
 import os
 import sys
