@@ -1,4 +1,3 @@
-#include <gtest/gtest.h>
 #include "tests/program/harness.h"
 
 #include <cstdio>
