@@ -5,8 +5,8 @@ writes (sombrel-render --curves: bin,hz,profile,eq,bass,subbass,treble,total).
 
 CURVES-DIR holds one CSV per case, written by scripts/manual: the eight
 profiles (white.csv ... dogs.csv, all other controls in the middle), the
-example equaliser setting (equaliser.csv, with example-eq.txt beside this
-file) and the tone controls at both ends (bass-1.csv ... treble-255.csv).
+example equaliser setting (equaliser.csv, with docs/manual/example-eq.txt)
+and the tone controls at both ends (bass-1.csv ... treble-255.csv).
 Writes into OUT-DIR: profile-NAME.png for each profile, profiles.png (all
 eight; the README shows a copy, docs/profiles.png), equaliser.png and
 tone.png. The same curves give the same PNG bytes (no software or date
@@ -95,7 +95,8 @@ def main(source, out):
 
     # The example equaliser setting: its curve, and each band's level at its
     # centre frequency as the slider sets it.
-    with open(os.path.join(os.path.dirname(os.path.abspath(__file__)), "example-eq.txt")) as f:
+    root = os.path.dirname(os.path.dirname(os.path.dirname(os.path.abspath(__file__))))
+    with open(os.path.join(root, "docs", "manual", "example-eq.txt")) as f:
         sliders = np.array([int(v) for v in f.read().strip().split(",")], dtype=float)
     centres = 20.0 * 2.0 ** (np.arange(31) * 0.332195)
     levels = -(sliders * 0.15748031 - 20.15748)
