@@ -73,10 +73,12 @@ def stretch(lines, name):
         sound = render(options, (last or 0) + 4)
         made = len(sound) // BLOCK if not stops else stops[0]
         last = made - 1 if last is None else last     # the block a stop cuts is not compared
-        if pos is None:
-            pos = find(int(play[-1]) // 4, sound[SKIP:SKIP + 16]) - SKIP
-            if pos < 0:
-                return report(False, '%s: the sound is not in the recording' % name)
+        for at in ([] if pos is not None else range(SKIP, SKIP + 12 * BLOCK, BLOCK)):  # where the render's frame 0 lies
+            pos = find(int(play[-1]) // 4, sound[at:at + 16]) - at
+            if pos >= 0:
+                break
+        if pos < 0:
+            return report(False, '%s: the sound is not in the recording' % name)
         begin = SKIP if n == 0 else (first + 2) * BLOCK
         found, after = follow(pos + begin, sound[begin:last * BLOCK])
         share = 100.0 * found / max(last * BLOCK - begin, 1)

@@ -38,28 +38,40 @@ TEST(Launch, ARunWithPlayStoresTheSettingsForTheNextStartAndEveryRunEndsWithZero
     ForgetStoredSettings();
 }
 
-TEST(Launch, HelpShowsTheAboutBoxThenOpensTheManualBesideTheProgram) {
+TEST(Launch, HelpShowsTheAboutBoxThenOpensTheManualBesideTheProgramAndSaysNothingWithoutIt) {
     char self[MAX_PATH];
     GetModuleFileNameA(nullptr, self, sizeof(self));
     const std::string command = std::string("\"") + self + "\" --mark-opened \"" + Marker() + "\" \"%1\"";
     RegSetValueA(HKEY_CLASSES_ROOT, ".pdf", REG_SZ, "SombrelTestPdf", 14);
     RegSetValueA(HKEY_CLASSES_ROOT, "SombrelTestPdf\\shell\\open\\command", REG_SZ, command.c_str(), static_cast<DWORD>(command.size()));
-    DeleteFileA(Marker().c_str());
-    Program p;
-    ASSERT_TRUE(Launch(&p, Exe)) << Exe;
-    PostMessageA(GetDlgItem(p.Window, 1051), BM_CLICK, 0, 0);
-    ASSERT_TRUE(PumpUntil([&] { return !OpenBoxes(p).empty() && ReadBox(OpenBoxes(p)[0]).Buttons > 0; }, 20000)) << "no about box";
-    const Box about = ReadBox(OpenBoxes(p)[0]);
-    EXPECT_TRUE(about.Caption == "Sombrel Player" && about.Text.find("1.00") != std::string::npos) << about.Text;
-    EXPECT_FALSE(PumpUntil(Opened, 1500)) << "the manual was opened while the about box was open";
-    PostMessageA(OpenBoxes(p)[0], WM_COMMAND, MAKEWPARAM(IDOK, BN_CLICKED), 0);
-    ASSERT_TRUE(PumpUntil(Opened, 20000)) << "the manual was not opened";
-    std::string opened;
-    std::getline(std::ifstream(Marker().c_str()), opened);
-    EXPECT_EQ(lstrcmpiA(opened.c_str(), (Exe.substr(0, Exe.find_last_of('\\')) + "\\Sombrel.pdf").c_str()), 0) << opened;
-    EXPECT_TRUE(Click(p, 1030) && Click(p, 1031)) << "Play and Stop";
-    EXPECT_EQ(Close(&p), 0);
-    EXPECT_EQ(BoxTexts(), std::vector<std::string>{});
+    const std::string alone = WorkDir() + "\\no-manual";  // a copy of the program with no manual beside it
+    CreateDirectoryA(alone.c_str(), nullptr);
+    ASSERT_TRUE(CopyFileA(Exe.c_str(), (alone + "\\Sombrel.exe").c_str(), FALSE));
+    for (const std::string& exe : {Exe, alone + "\\Sombrel.exe"}) {
+        DeleteFileA(Marker().c_str());
+        Program p;
+        ASSERT_TRUE(Launch(&p, exe)) << exe;
+        PostMessageA(GetDlgItem(p.Window, 1051), BM_CLICK, 0, 0);
+        ASSERT_TRUE(PumpUntil([&] { return !OpenBoxes(p).empty() && ReadBox(OpenBoxes(p)[0]).Buttons > 0; }, 20000)) << "no about box";
+        const Box about = ReadBox(OpenBoxes(p)[0]);
+        EXPECT_TRUE(about.Caption == "Sombrel Player" && about.Text.find("Sombrel Player") != std::string::npos &&
+                    about.Text.find("1.00") != std::string::npos && about.Icon == nullptr && about.Buttons == 1) << about.Text;
+        EXPECT_FALSE(PumpUntil(Opened, 1500)) << "the manual was opened while the about box was open";
+        PostMessageA(OpenBoxes(p)[0], WM_COMMAND, MAKEWPARAM(IDOK, BN_CLICKED), 0);
+        if (exe == Exe) {
+            ASSERT_TRUE(PumpUntil(Opened, 20000)) << "the manual was not opened";
+            std::string opened;
+            std::getline(std::ifstream(Marker().c_str()), opened);
+            EXPECT_EQ(lstrcmpiA(opened.c_str(), (Exe.substr(0, Exe.find_last_of('\\')) + "\\Sombrel.pdf").c_str()), 0) << opened;
+        } else {  // what the shell says is its own: no box of the program's
+            PumpUntil([] { return false; }, 2000);
+            for (HWND box : OpenBoxes(p)) EXPECT_NE(ReadBox(box).Caption.substr(0, 7), "Sombrel") << ReadBox(box).Text;
+            EXPECT_FALSE(Opened());
+        }
+        EXPECT_TRUE(Click(p, 1030) && Click(p, 1031)) << "Play and Stop";
+        EXPECT_EQ(Close(&p), 0);
+        Boxes.clear();  // the shell's, if any
+    }
     RegDeleteTreeA(HKEY_CLASSES_ROOT, "SombrelTestPdf");
     RegDeleteTreeA(HKEY_CLASSES_ROOT, ".pdf");
 }
