@@ -337,6 +337,9 @@ TEST_F(App, RingSlotsGoInOrderAndEveryPlayStartsAgainAtSlot0) {
     for (int32_t round = 0; round < 3; ++round) {
         Press(PlayId);  // round 1 and 2: right after Stop, with its handed-back buffers still to come
         ASSERT_TRUE(WriteSlot == 2 && DoneSlot == 0 && SynthState.BlockIndex == 2) << "round " << round;
+        const WAVEFORMATEX& f = StreamFormat;  // 48 000 Hz, 16-bit stereo PCM, its derived fields computed
+        EXPECT_TRUE(f.wFormatTag == 1 && f.nChannels == 2 && f.nSamplesPerSec == 48000 && f.wBitsPerSample == 16 &&
+                    f.nBlockAlign == 4 && f.nAvgBytesPerSec == 192000 && f.cbSize == 0);
         for (int32_t refill = 1; refill <= 4; ++refill) {
             ASSERT_TRUE(PumpUntil([&] { return DoneSlot == refill % 3; }, 3000)) << "round " << round << " refill " << refill;
             EXPECT_TRUE(RingInOrder()) << "WriteSlot " << WriteSlot << ", DoneSlot " << DoneSlot;
@@ -616,7 +619,7 @@ TEST_F(App, PlayChecksTheFieldsOfTheFeaturesThatAreOnRewritesThemAndSaysWhatIsWr
         for (const std::string& box : RedWhileOpen) red += (red.empty() ? "" : " ") + box;
         EXPECT_EQ(IsPlaying, r.Complaints.empty() ? 1 : 0);
         for (const Box& box : Boxes)
-            EXPECT_TRUE(box.Caption == "Sombrel Player" && box.Icon == IconOf(MB_ICONHAND) && box.Buttons == 1) << box.Text;
+            EXPECT_TRUE(box.Caption == "Sombrel Player" && box.Icon == LoadIconA(nullptr, IDI_HAND) && box.Buttons == 1) << box.Text;
         EXPECT_EQ(BoxTexts(), std::vector<std::string>(r.Complaints.begin(), r.Complaints.end()));
         EXPECT_EQ(red, r.Red);
         for (int32_t i = 0; i < 4; ++i) {
@@ -739,7 +742,7 @@ TEST_F(App, AUserWhoMayNotWriteTheMachineKeyKeepsTheSettingsInTheirOwnKey) {
     ASSERT_TRUE(DenyKey(HKEY_CURRENT_USER));
     SaveSettings();  // neither key: one box
     ASSERT_EQ(Boxes.size(), 1u);
-    EXPECT_TRUE(Boxes[0].Caption == "Sombrel Player" && Boxes[0].Icon == IconOf(MB_ICONINFORMATION));
+    EXPECT_TRUE(Boxes[0].Caption == "Sombrel Player" && Boxes[0].Icon == LoadIconA(nullptr, IDI_ASTERISK));
     EXPECT_EQ(BoxTexts(), std::vector<std::string>{"Registry Creation Error 8734"});
     ASSERT_TRUE(ForgetStoredSettings());
 }
@@ -811,7 +814,7 @@ void ExpectFailures(const std::vector<std::pair<std::string, std::string>>& code
     for (size_t i = 0; i + 1 < Boxes.size(); i += 2) {
         EXPECT_TRUE(Boxes[i].Icon == nullptr && Boxes[i].Buttons == 1) << Boxes[i].Text;
         const Box& device = Boxes[i + 1];
-        EXPECT_TRUE(device.Caption == "Sombrel Player" && device.Icon == IconOf(MB_ICONEXCLAMATION) && device.Buttons == 1 &&
+        EXPECT_TRUE(device.Caption == "Sombrel Player" && device.Icon == LoadIconA(nullptr, IDI_EXCLAMATION) && device.Buttons == 1 &&
                     std::find(texts.begin(), texts.end(), device.Text) != texts.end()) << "after " << Boxes[i].Text << ": " << device.Text;
         if (Boxes[i].Text != "Error 4532") seen.push_back({Boxes[i].Text, Boxes[i].Caption});  // 0 to 3 of them
     }

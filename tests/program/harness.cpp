@@ -9,12 +9,6 @@ bool (*HoldBox)(const Box&) = nullptr;
 namespace {
 const char KeyName[] = "Software\\Sombrel";
 
-std::string TextOf(HWND window) {
-    char text[512] = {};
-    GetWindowTextA(window, text, sizeof(text));
-    return text;
-}
-
 // A box's visible buttons and its icon (a static with SS_ICON).
 BOOL CALLBACK ReadBoxChild(HWND child, LPARAM data) {
     char cls[16] = {};
@@ -48,34 +42,29 @@ void CALLBACK AnswerBox(HWND, UINT, UINT_PTR, DWORD) {
     PostMessageA(own.second.back(), WM_COMMAND, MAKEWPARAM(IDOK, BN_CLICKED), 0);
 }
 
-// Undoes DenyKey: an empty access list still lets the owner change it.
-void OpenUp(HKEY hive) {
+// Gives the key an empty access list (nobody may), or none (everybody may);
+// an empty list still lets the owner change it.
+bool SetAccess(HKEY hive, bool deny) {
     HKEY key = nullptr;
-    if (RegOpenKeyExA(hive, KeyName, 0, WRITE_DAC, &key) != ERROR_SUCCESS) return;
+    if (RegCreateKeyExA(hive, KeyName, 0, nullptr, 0, WRITE_DAC, nullptr, &key, nullptr) != ERROR_SUCCESS) return false;
     SECURITY_DESCRIPTOR sd;
+    ACL acl;
     InitializeSecurityDescriptor(&sd, SECURITY_DESCRIPTOR_REVISION);
-    SetSecurityDescriptorDacl(&sd, TRUE, nullptr, FALSE);
-    RegSetKeySecurity(key, DACL_SECURITY_INFORMATION, &sd);
+    InitializeAcl(&acl, sizeof(acl), ACL_REVISION);
+    SetSecurityDescriptorDacl(&sd, TRUE, deny ? &acl : nullptr, FALSE);
+    const LONG r = RegSetKeySecurity(key, DACL_SECURITY_INFORMATION, &sd);
     RegCloseKey(key);
+    return r == ERROR_SUCCESS;
 }
 }  // namespace
 
 Box ReadBox(HWND box) {
-    Box read{TextOf(box), "", nullptr, 0};
-    char text[512] = {};
+    char caption[256] = {}, text[512] = {};
+    GetWindowTextA(box, caption, sizeof(caption));
     GetDlgItemTextA(box, 0xFFFF, text, sizeof(text));  // the message's static text
-    read.Text = text;
+    Box read{caption, text, nullptr, 0};
     EnumChildWindows(box, ReadBoxChild, reinterpret_cast<LPARAM>(&read));
     return read;
-}
-
-HICON IconOf(UINT style) {
-    switch (style) {
-    case MB_ICONHAND: return LoadIconA(nullptr, IDI_HAND);
-    case MB_ICONEXCLAMATION: return LoadIconA(nullptr, IDI_EXCLAMATION);
-    case MB_ICONINFORMATION: return LoadIconA(nullptr, IDI_ASTERISK);
-    default: return nullptr;
-    }
 }
 
 void StartAnsweringBoxes() { SetTimer(nullptr, 0, 20, AnswerBox); }
@@ -109,10 +98,8 @@ bool AskHarness(const char* request, const std::string& detail) {
 }
 
 bool ForgetStoredSettings() {
-    for (HKEY hive : {HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER}) {
-        OpenUp(hive);
-        RegDeleteKeyA(hive, KeyName);
-    }
+    for (HKEY hive : {HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER})
+        if (KeyExists(hive) && SetAccess(hive, false)) RegDeleteKeyA(hive, KeyName);
     return !KeyExists(HKEY_LOCAL_MACHINE) && !KeyExists(HKEY_CURRENT_USER);
 }
 
@@ -176,19 +163,7 @@ int32_t ValueCount(HKEY hive) {
     return static_cast<int32_t>(count);
 }
 
-bool DenyKey(HKEY hive) {
-    HKEY key = nullptr;
-    if (RegCreateKeyExA(hive, KeyName, 0, nullptr, 0, KEY_ALL_ACCESS, nullptr, &key, nullptr) != ERROR_SUCCESS)
-        return false;
-    SECURITY_DESCRIPTOR sd;
-    InitializeSecurityDescriptor(&sd, SECURITY_DESCRIPTOR_REVISION);
-    ACL acl;
-    InitializeAcl(&acl, sizeof(acl), ACL_REVISION);
-    SetSecurityDescriptorDacl(&sd, TRUE, &acl, FALSE);  // a list without entries
-    const LONG r = RegSetKeySecurity(key, DACL_SECURITY_INFORMATION, &sd);
-    RegCloseKey(key);
-    return r == ERROR_SUCCESS;
-}
+bool DenyKey(HKEY hive) { return SetAccess(hive, true); }
 
 namespace {
 BOOL CALLBACK FindMain(HWND window, LPARAM data) {

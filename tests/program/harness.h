@@ -32,11 +32,10 @@ bool PumpUntil(F done, DWORD ms) {
 struct Box {
     std::string Caption;
     std::string Text;
-    HICON Icon;        // the system icon shown (IconOf), nullptr for none
+    HICON Icon;        // the system icon shown (LoadIconA(nullptr, IDI_...)), nullptr for none
     int32_t Buttons;   // visible buttons
 };
 Box ReadBox(HWND box);
-HICON IconOf(UINT style);   // MB_ICONHAND, MB_ICONEXCLAMATION, MB_ICONINFORMATION
 
 // In the program's process: from StartAnsweringBoxes on, a thread timer
 // (which a box's own modal loop dispatches too) notes every box this thread
