@@ -45,6 +45,7 @@ void InitEngine(SynthRecord* state) {
     FillFloats(state->TrebleResponse, 1.0f, FrameLength);
     FillFloats(state->TotalResponse, 1.0f, FrameLength);
     ZeroFloats(state->DropTable, BlockFrames);
+    SetExcitationValues(state->DropTable);
     InitEqResponse(state);
     BuildSynthesisWindow();
     state->RampDepthDb = 20.0f;
@@ -138,6 +139,7 @@ void ProcessBlock(const ControlRecord* settings, ControlRecord* cached, SynthRec
         state->DropWidth = DropWidthFor(now[Hardness]);
         FillBell(state->DropTable, state->DropWidth, state->OutputGain);
         PermuteByTable(state->DropTable, PermutationTable[0]);
+        SetExcitationValues(state->DropTable);
         was[Attenuator] = now[Attenuator];
         was[Hardness] = now[Hardness];
     }
@@ -163,8 +165,7 @@ void ProcessBlock(const ControlRecord* settings, ControlRecord* cached, SynthRec
     }
     if (responsesChanged) BuildTotalResponse(state);
 
-    CopyFloats(state->DropTable, state->DirectChannel, BlockFrames);
-    ShuffleExcitation(state->DirectChannel, &state->BlockIndex);
+    MakeExcitation(state->DirectChannel, &state->BlockIndex);
     GenerateBlock(state->DirectChannel, state->ReversedChannel, state->TotalResponse, state->BlockIndex);
     UpdatePeaks(state->DirectChannel, state->ReversedChannel);
     ClipAndConvert(state->DirectChannel, state->ReversedChannel, state->PcmBlock);
