@@ -5,6 +5,7 @@
 #include <cmath>
 
 #include "app/core_state.h"
+#include "engine/block_filter.h"
 #include "engine/generator.h"
 #include "engine/platform.h"
 #include "engine/shuffle.h"
@@ -44,6 +45,7 @@ void InitEngine(SynthRecord* state) {
     FillFloats(state->SubBassResponse, 1.0f, FrameLength);
     FillFloats(state->TrebleResponse, 1.0f, FrameLength);
     FillFloats(state->TotalResponse, 1.0f, FrameLength);
+    SetFilterResponse(state->TotalResponse);
     ZeroFloats(state->DropTable, BlockFrames);
     SetExcitationValues(state->DropTable);
     InitEqResponse(state);
@@ -101,6 +103,7 @@ void BuildTotalResponse(SynthRecord* state) {
         for (int32_t k = FirstAudibleBin; k <= LastAudibleBin; ++k)
             total[k] = static_cast<float>(total[k] * scale);
     }
+    SetFilterResponse(total);
 }
 
 void ClipAndConvert(float* direct, float* reversed, int16_t* pcm) {
@@ -166,7 +169,7 @@ void ProcessBlock(const ControlRecord* settings, ControlRecord* cached, SynthRec
     if (responsesChanged) BuildTotalResponse(state);
 
     MakeExcitation(state->DirectChannel, &state->BlockIndex);
-    GenerateBlock(state->DirectChannel, state->ReversedChannel, state->TotalResponse, state->BlockIndex);
+    GenerateBlock(state->DirectChannel, state->ReversedChannel, state->BlockIndex);
     UpdatePeaks(state->DirectChannel, state->ReversedChannel);
     ClipAndConvert(state->DirectChannel, state->ReversedChannel, state->PcmBlock);
     state->BlockIndex += 1;
