@@ -107,21 +107,17 @@ void BuildTotalResponse(SynthRecord* state) {
 }
 
 void ClipAndConvert(float* direct, float* reversed, int16_t* pcm) {
-    // Four frames at a time. The conversion truncates toward zero as a cast
-    // does; the saturating pack changes nothing, all values being clipped.
-    typedef float Float4 __attribute__((vector_size(16)));
+    // Four frames at a time. max(-32000, x) and min(32000, x) are exactly
+    // "below -32000 becomes -32000, above 32000 becomes 32000". The
+    // conversion truncates toward zero as a cast does; the saturating pack
+    // changes nothing, all values being clipped.
+    const __m128 low = _mm_set1_ps(-ClipLevel), high = _mm_set1_ps(ClipLevel);
     for (int32_t i = 0; i < BlockFrames; i += 4) {
-        Float4 right, left;
-        __builtin_memcpy(&right, direct + i, sizeof right);
-        __builtin_memcpy(&left, reversed + i, sizeof left);
-        right = right < -ClipLevel ? -ClipLevel : right;
-        right = right > ClipLevel ? ClipLevel : right;
-        left = left < -ClipLevel ? -ClipLevel : left;
-        left = left > ClipLevel ? ClipLevel : left;
-        __builtin_memcpy(direct + i, &right, sizeof right);
-        __builtin_memcpy(reversed + i, &left, sizeof left);
-        const __m128i r = _mm_cvttps_epi32(reinterpret_cast<__m128>(right));
-        const __m128i l = _mm_cvttps_epi32(reinterpret_cast<__m128>(left));
+        const __m128 right = _mm_min_ps(high, _mm_max_ps(low, _mm_loadu_ps(direct + i)));
+        const __m128 left = _mm_min_ps(high, _mm_max_ps(low, _mm_loadu_ps(reversed + i)));
+        _mm_storeu_ps(direct + i, right);
+        _mm_storeu_ps(reversed + i, left);
+        const __m128i r = _mm_cvttps_epi32(right), l = _mm_cvttps_epi32(left);
         _mm_storeu_si128(reinterpret_cast<__m128i*>(pcm + 2 * i),
                          _mm_packs_epi32(_mm_unpacklo_epi32(l, r), _mm_unpackhi_epi32(l, r)));
     }
