@@ -9,11 +9,14 @@
 //
 // The right channel takes the frame as it is, the left its circular time
 // reversal. Each output sample is the sum of two frames (block 0: one), so
-// the accumulators keep only what the next blocks still need:
+// the accumulators keep only what the next blocks still need; after block b,
+// with F(b)[m..n] samples m..n of frame b:
 //
-//   after block b   | 0 .. 4095          | 4096 .. 8191   | 8192 .. 12287   |
-//   accumulator     | F(b-1) + F(b) tail | F(b) middle    | F(b) last 4096  |
-//                     complete             + F(b+1) start   + F(b+1) middle
+//   0 .. 4095       F(b-1)[12288..16383] + F(b)[4096..8191]   complete
+//   4096 .. 8191    F(b)[8192..12287]    waits for F(b+1)[0..4095]
+//   8192 .. 12287   F(b)[12288..16383]   waits for F(b+1)[4096..8191]
+//
+// Block b+1 emits 0..8191 and moves 8192..12287 down, its frame added.
 //
 // Runs on the window thread only; not re-entrant.
 #pragma once
