@@ -1,8 +1,11 @@
 #include "engine/block.h"
 
+#include <emmintrin.h>
+
 #include <cmath>
 
 #include "app/core_state.h"
+#include "engine/block_filter.h"
 #include "engine/generator.h"
 #include "engine/platform.h"
 #include "engine/shuffle.h"
@@ -42,7 +45,9 @@ void InitEngine(SynthRecord* state) {
     FillFloats(state->SubBassResponse, 1.0f, FrameLength);
     FillFloats(state->TrebleResponse, 1.0f, FrameLength);
     FillFloats(state->TotalResponse, 1.0f, FrameLength);
+    SetFilterResponse(state->TotalResponse);
     ZeroFloats(state->DropTable, BlockFrames);
+    SetExcitationValues(state->DropTable);
     InitEqResponse(state);
     BuildSynthesisWindow();
     state->RampDepthDb = 20.0f;
@@ -98,18 +103,23 @@ void BuildTotalResponse(SynthRecord* state) {
         for (int32_t k = FirstAudibleBin; k <= LastAudibleBin; ++k)
             total[k] = static_cast<float>(total[k] * scale);
     }
+    SetFilterResponse(total);
 }
 
 void ClipAndConvert(float* direct, float* reversed, int16_t* pcm) {
-    for (int32_t i = 0; i < BlockFrames; ++i) {
-        if (direct[i] < -ClipLevel) direct[i] = -ClipLevel;
-        if (direct[i] > ClipLevel) direct[i] = ClipLevel;
-        if (reversed[i] < -ClipLevel) reversed[i] = -ClipLevel;
-        if (reversed[i] > ClipLevel) reversed[i] = ClipLevel;
-    }
-    for (int32_t i = 0; i < BlockFrames; ++i) {
-        pcm[2 * i] = static_cast<int16_t>(reversed[i]);
-        pcm[2 * i + 1] = static_cast<int16_t>(direct[i]);
+    // Four frames at a time. max(-32000, x) and min(32000, x) are exactly
+    // "below -32000 becomes -32000, above 32000 becomes 32000". The
+    // conversion truncates toward zero as a cast does; the saturating pack
+    // changes nothing, all values being clipped.
+    const __m128 low = _mm_set1_ps(-ClipLevel), high = _mm_set1_ps(ClipLevel);
+    for (int32_t i = 0; i < BlockFrames; i += 4) {
+        const __m128 right = _mm_min_ps(high, _mm_max_ps(low, _mm_loadu_ps(direct + i)));
+        const __m128 left = _mm_min_ps(high, _mm_max_ps(low, _mm_loadu_ps(reversed + i)));
+        _mm_storeu_ps(direct + i, right);
+        _mm_storeu_ps(reversed + i, left);
+        const __m128i r = _mm_cvttps_epi32(right), l = _mm_cvttps_epi32(left);
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(pcm + 2 * i),
+                         _mm_packs_epi32(_mm_unpacklo_epi32(l, r), _mm_unpackhi_epi32(l, r)));
     }
 }
 
@@ -128,6 +138,7 @@ void ProcessBlock(const ControlRecord* settings, ControlRecord* cached, SynthRec
         state->DropWidth = DropWidthFor(now[Hardness]);
         FillBell(state->DropTable, state->DropWidth, state->OutputGain);
         PermuteByTable(state->DropTable, PermutationTable[0]);
+        SetExcitationValues(state->DropTable);
         was[Attenuator] = now[Attenuator];
         was[Hardness] = now[Hardness];
     }
@@ -153,9 +164,8 @@ void ProcessBlock(const ControlRecord* settings, ControlRecord* cached, SynthRec
     }
     if (responsesChanged) BuildTotalResponse(state);
 
-    CopyFloats(state->DropTable, state->DirectChannel, BlockFrames);
-    ShuffleExcitation(state->DirectChannel, &state->BlockIndex);
-    GenerateBlock(state->DirectChannel, state->ReversedChannel, state->TotalResponse, state->BlockIndex);
+    MakeExcitation(state->DirectChannel, &state->BlockIndex);
+    GenerateBlock(state->DirectChannel, state->ReversedChannel, state->BlockIndex);
     UpdatePeaks(state->DirectChannel, state->ReversedChannel);
     ClipAndConvert(state->DirectChannel, state->ReversedChannel, state->PcmBlock);
     state->BlockIndex += 1;

@@ -33,5 +33,6 @@ void ProcessBlock(const ControlRecord* settings, ControlRecord* cached, SynthRec
 void ClipAndConvert(float* direct, float* reversed, int16_t* pcm);
 
 // Rebuilds TotalResponse: product of the five responses over bins 6..6825,
-// normalised to a mean square of 1; 1e-22 elsewhere.
+// normalised to a mean square of 1; 1e-22 elsewhere. Hands it to the block
+// filter (SetFilterResponse).
 void BuildTotalResponse(SynthRecord* state);

@@ -1,6 +1,10 @@
 // engine/fft.h: in-place complex FFT on split float arrays.
 //
-// Conventions (the block generator relies on them):
+// The transform as first described, radix-2 in single precision. The block
+// path has its own real-input route (engine/block_filter.h); the tests keep
+// this one as that route's oracle.
+//
+// Conventions:
 //   forward  X[k] = sum x[n] e^(-2 pi i nk/N), unscaled
 //   inverse  x[n] = (1/N) sum X[k] e^(+2 pi i nk/N)
 //   natural order in and out; re and im each hold N = 2^order floats;

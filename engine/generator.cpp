@@ -2,14 +2,12 @@
 
 #include <cmath>
 
-#include "engine/fft.h"
+#include "engine/block_filter.h"
 #include "engine/vector_ops.h"
 #include "timers/timer_gains.h"
 
-float FftReal[FrameLength];
-float FftImag[FrameLength];
-float ReversedFrame[FrameLength];
-float SynthesisWindow[FrameLength];
+alignas(64) float FftReal[FrameLength];
+alignas(64) float SynthesisWindow[FrameLength];
 float OverlapDirect[OverlapLength];
 float OverlapReversed[OverlapLength];
 
@@ -33,43 +31,57 @@ void BuildSynthesisWindow() {
     FillFloats(SynthesisWindow + EdgeLength, 1.0f, BlockFrames);
 }
 
-void GenerateBlock(float* direct, float* reversed, const float* response, int32_t blockIndex) {
-    ZeroFloats(FftReal, FrameLength);
-    ZeroFloats(FftImag, FrameLength);
-    CopyFloats(direct, FftReal + EdgeLength, BlockFrames);
+namespace {
 
-    FftForward(FftReal, FftImag, FftOrder);
-    MultiplyFloats(FftReal, response, FrameLength);
-    MultiplyFloats(FftImag, response, FrameLength);
-    FftInverse(FftReal, FftImag, FftOrder);
-    MultiplyFloats(FftReal, SynthesisWindow, FrameLength);
+typedef float Float4 __attribute__((vector_size(16)));
+typedef int32_t Int4 __attribute__((vector_size(16)));
 
-    // Circular time reversal: index k goes to (16384 - k) mod 16384.
-    ReversedFrame[0] = FftReal[0];
-    for (int32_t k = 1; k < FrameLength; ++k) ReversedFrame[FrameLength - k] = FftReal[k];
+Float4 Load4(const float* p) {
+    Float4 v;
+    __builtin_memcpy(&v, p, sizeof v);
+    return v;
+}
+
+void Store4(float* p, Float4 v) { __builtin_memcpy(p, &v, sizeof v); }
+
+// p[0], p[-1], p[-2], p[-3]: four samples of the reversed frame.
+Float4 Load4Reversed(const float* p) { return __builtin_shuffle(Load4(p - 3), Int4{3, 2, 1, 0}); }
+
+}  // namespace
+
+void GenerateBlock(float* direct, float* reversed, int32_t blockIndex) {
+    const float* frame = FftReal;
+    FilterFrame(direct, SynthesisWindow, FftReal);
+    // The reversed frame is read in place: its sample k is frame[(16384 - k) mod 16384].
+    const float* mirror = frame + FrameLength;  // mirror[-k] = frame[16384 - k], k = 1 .. 16383
 
     if (blockIndex == 0) {
-        // A fresh stream: nothing of an earlier Play may be heard.
-        ZeroFloats(OverlapDirect, OverlapLength);
-        ZeroFloats(OverlapReversed, OverlapLength);
-        CopyFloats(FftReal + EdgeLength, OverlapDirect, FrameLength - EdgeLength);
-        CopyFloats(ReversedFrame + EdgeLength, OverlapReversed, FrameLength - EdgeLength);
-        CopyFloats(OverlapDirect, direct, BlockFrames);
-        CopyFloats(OverlapReversed, reversed, BlockFrames);
-    } else {
-        //  accumulator: | 0 .. 4095 | 4096 ....... 20479 |
-        //                 tail        + this frame (16384)
-        // emit 0..8191, then shift down by one block.
-        for (int32_t i = 0; i < FrameLength; ++i) {
-            OverlapDirect[EdgeLength + i] += FftReal[i];
-            OverlapReversed[EdgeLength + i] += ReversedFrame[i];
+        // A fresh stream: the middle of this frame alone, and its second half kept.
+        for (int32_t i = 0; i < OverlapLength; i += 4) {
+            Store4(OverlapDirect + i, Load4(frame + EdgeLength + i));
+            Store4(OverlapReversed + i, Load4Reversed(mirror - EdgeLength - i));
         }
         CopyFloats(OverlapDirect, direct, BlockFrames);
         CopyFloats(OverlapReversed, reversed, BlockFrames);
-        CopyFloats(OverlapDirect + BlockFrames, OverlapDirect, OverlapLength - BlockFrames);
-        CopyFloats(OverlapReversed + BlockFrames, OverlapReversed, OverlapLength - BlockFrames);
-        ZeroFloats(OverlapDirect + OverlapLength - BlockFrames, BlockFrames);
-        ZeroFloats(OverlapReversed + OverlapLength - BlockFrames, BlockFrames);
+    } else {
+        // Each sample is the sum of two frames, added in one float addition
+        // (as a running accumulator starting from zero would add them).
+        CopyFloats(OverlapDirect, direct, EdgeLength);
+        CopyFloats(OverlapReversed, reversed, EdgeLength);
+        for (int32_t i = EdgeLength; i < BlockFrames; i += 4)
+            Store4(direct + i, Load4(OverlapDirect + i) + Load4(frame + i - EdgeLength));
+        reversed[EdgeLength] = OverlapReversed[EdgeLength] + frame[0];
+        for (int32_t i = EdgeLength + 1; i < EdgeLength + 4; ++i) reversed[i] = OverlapReversed[i] + mirror[EdgeLength - i];
+        for (int32_t i = EdgeLength + 4; i < BlockFrames; i += 4)
+            Store4(reversed + i, Load4(OverlapReversed + i) + Load4Reversed(mirror + EdgeLength - i));
+        for (int32_t i = 0; i < EdgeLength; i += 4) {
+            Store4(OverlapDirect + i, Load4(OverlapDirect + BlockFrames + i) + Load4(frame + EdgeLength + i));
+            Store4(OverlapReversed + i, Load4(OverlapReversed + BlockFrames + i) + Load4Reversed(mirror - EdgeLength - i));
+        }
+        for (int32_t i = EdgeLength; i < OverlapLength; i += 4) {
+            Store4(OverlapDirect + i, Load4(frame + EdgeLength + i));
+            Store4(OverlapReversed + i, Load4Reversed(mirror - EdgeLength - i));
+        }
     }
 
     ApplyTimerGains(direct, reversed, blockIndex);

@@ -11,7 +11,7 @@
 constexpr int32_t BlockFrames = 8192;         // frames per block, 170.67 ms at 48 kHz
 constexpr int32_t FrameLength = 16384;        // transform length: 4096 zeros, excitation, 4096 zeros
 constexpr int32_t FftOrder = 14;              // log2(FrameLength)
-constexpr int32_t OverlapLength = 20480;      // overlap-add accumulator length
+constexpr int32_t OverlapLength = 12288;      // overlap-add accumulator: what later blocks still need
 constexpr int32_t SampleRate = 48000;
 constexpr int32_t FirstAudibleBin = 6;        // 17.58 Hz
 constexpr int32_t LastAudibleBin = 6825;      // 19 995.1 Hz

@@ -1,6 +1,7 @@
 // The alarm chime's sound: partials, channel split, length and loudness.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdlib>
 
@@ -71,4 +72,21 @@ TEST(MakeChime, LoudnessFollowsTheVolume) {
             << "largest sample at volume " << c.Volume;
     }
     EXPECT_NE(ChimePcm[2 * (ChimeFrames - 1)], 0) << "the chord lasts all 262144 frames, no envelope";
+}
+
+TEST(MakeChime, WithinOneLsbOfASinPerFrame) {
+    // Reference: a sin per frame and partial, float sums in partial order.
+    static float reference[2 * ChimeFrames];
+    static int16_t pcm[2 * ChimeFrames];
+    const float peak = MakeChime(200);
+    std::fill(reference, reference + 2 * ChimeFrames, 0.0f);
+    for (int32_t k = 0; k < ChimePartialCount; ++k) {
+        const double step = ChimePartials[k] * double(0.0001308997f), amplitude = ChimePartials[32 + k];
+        for (int32_t n = 0; n < ChimeFrames; ++n)
+            reference[2 * n + k % 2] = static_cast<float>(reference[2 * n + k % 2] + std::sin(n * step) * amplitude);
+    }
+    ScaleChime(reference, peak, pcm);
+    int32_t worst = 0;
+    for (int32_t i = 0; i < 2 * ChimeFrames; ++i) worst = std::max(worst, std::abs(pcm[i] - ChimePcm[i]));
+    EXPECT_LE(worst, 1);
 }

@@ -128,3 +128,21 @@ TEST(ShuffleExcitation, SignFollowsTheParityOfTheIntegerPart) {
     ShuffleExcitation(v.data(), &index);
     for (int i = 0; i < 7; ++i) EXPECT_EQ(v[i], out[i]) << "sign rule on " << in[i];
 }
+
+TEST(MakeExcitation, EqualsShuffleExcitationInOrderAndAfterJumps) {
+    // The composites kept from block to block must give every index its own
+    // order: in sequence (carries through bits 1..9) and after jumps.
+    const std::vector<float> drop = Excitation();
+    SetExcitationValues(drop.data());
+    std::vector<int32_t> indices;
+    for (int32_t n = 0; n <= 520; ++n) indices.push_back(n);
+    for (int32_t n : {131071, 131072, 5, 524286, 524287, 524288, 524289, 1, 262143, 0}) indices.push_back(n);
+    for (int32_t n : indices) {
+        std::vector<float> expected = drop, v(BlockFrames);
+        int32_t a = n, b = n;
+        ShuffleExcitation(expected.data(), &a);
+        MakeExcitation(v.data(), &b);
+        ASSERT_EQ(b, a) << "index " << n;
+        ASSERT_EQ(v, expected) << "index " << n;
+    }
+}

@@ -12,8 +12,9 @@
 
 namespace {
 
-// Each gain is one double pow rounded into a float product: the float
-// rounding of the sample (6e-8 relative) is all that may differ.
+// Each gain is 10^x to ~1e-13 (a geometric sequence anchored with pow)
+// rounded into a float product: the float rounding of the sample (6e-8
+// relative) is all that may differ from the law.
 constexpr double kGainTolerance = 1.2e-7;
 
 struct Channels {

@@ -19,7 +19,9 @@ extern int16_t ChimePcm[2 * ChimeFrames];           // the chord as played
 void MakeChimePartials(float* partials);
 
 // Sums the chord into samples (2 * 262144 floats, zeroed first): partial 2k
-// on the left, 2k+1 on the right, each from phase 0 at frame 0.
+// on the left, 2k+1 on the right, each from phase 0 at frame 0, added in
+// partial order and rounded to float after each addition; equal to a sin per
+// frame apart from rare rounding.
 void SynthesizeChime(const float* partials, float* samples);
 
 // The chime's peak for a volume setting 1..255: the rain's output gain law,

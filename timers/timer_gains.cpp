@@ -1,5 +1,6 @@
 #include "timers/timer_gains.h"
 
+#include <algorithm>
 #include <cmath>
 
 #include "app/core_state.h"
@@ -14,15 +15,55 @@ int64_t BlocksIn(int32_t minutes) {
     return static_cast<int64_t>(minutes * static_cast<double>(FramesPerMinute) * (1.0 / BlockFrames));
 }
 
-// Multiplies both channels by 10^x(n) frame by frame, the same gain for both.
-// `count` advances once per frame before x is taken from it.
+// A ramp's gains 10^x(n), x linear in the frame count n, form a geometric
+// sequence: each is the one before times 10^(dx). pow anchors the sequence
+// at the first frame of every run of RampAnchorFrames, so that the drift of
+// the products stays near 1e-13 relative and each float sample equals the
+// one with a pow per frame, apart from rare rounding. Four frames are in
+// flight, each stepping by 10^(4 dx), so the products do not wait on each
+// other.
+constexpr int32_t RampAnchorFrames = 512;
+
+// Multiplies both channels frame by frame by 10^x(count), the same gain for
+// both; count advances once per frame before x is taken from it, but not
+// past limit, where the gain holds.
+typedef double Double4 __attribute__((vector_size(32)));
+typedef float Float4 __attribute__((vector_size(16)));
+
+// samples[i] = float(g[i] * samples[i]) for four frames.
+void Scale4(float* samples, Double4 g) {
+    Float4 v;
+    __builtin_memcpy(&v, samples, sizeof v);
+    v = __builtin_convertvector(g * __builtin_convertvector(v, Double4), Float4);
+    __builtin_memcpy(samples, &v, sizeof v);
+}
+
 template <typename GainExponent>
-void ApplyRamp(float* direct, float* reversed, int64_t* count, GainExponent exponent) {
-    for (int32_t i = 0; i < BlockFrames; ++i) {
-        *count += 1;
-        const double g = std::pow(10.0, exponent(*count));
-        direct[i] = static_cast<float>(g * direct[i]);
-        reversed[i] = static_cast<float>(g * reversed[i]);
+void ApplyRamp(float* direct, float* reversed, int64_t* count, int64_t limit, double dx, GainExponent exponent) {
+    const int32_t running = static_cast<int32_t>(std::min<int64_t>(BlockFrames, std::max<int64_t>(0, limit - *count)));
+    const double ratio = std::pow(10.0, dx), ratio4 = std::pow(10.0, 4 * dx);
+    const int64_t first = *count + 1;  // the count at frame 0
+    for (int32_t start = 0; start < running; start += RampAnchorFrames) {
+        const int32_t end = std::min(running, start + RampAnchorFrames);
+        Double4 g;
+        g[0] = std::pow(10.0, exponent(first + start));
+        for (int32_t l = 1; l < 4; ++l) g[l] = g[l - 1] * ratio;
+        int32_t i = start;
+        for (; i + 4 <= end; i += 4) {
+            Scale4(direct + i, g);
+            Scale4(reversed + i, g);
+            g *= ratio4;
+        }
+        for (int32_t l = 0; i < end; ++i, ++l) {  // the fade-out reaching its end mid-block
+            direct[i] = static_cast<float>(g[l] * direct[i]);
+            reversed[i] = static_cast<float>(g[l] * reversed[i]);
+        }
+    }
+    *count += running;
+    const double held = std::pow(10.0, exponent(*count));
+    for (int32_t i = running; i < BlockFrames; ++i) {
+        direct[i] = static_cast<float>(held * direct[i]);
+        reversed[i] = static_cast<float>(held * reversed[i]);
     }
 }
 
@@ -75,16 +116,17 @@ void ApplyTimerGains(float* direct, float* reversed, int32_t blockIndex) {
 
     // Start ramp: -20 dB to 0 dB over the 16384 frames of blocks 0 and 1;
     // a later wrap of the block index to 0 finds the count complete.
+    constexpr int64_t NoLimit = INT64_MAX;
     if ((blockIndex == 0 || blockIndex == 1) && s->StartRampCount < StartRampFrames) {
         const double slope = s->StartRampSlopeDb;
-        ApplyRamp(direct, reversed, &s->StartRampCount,
+        ApplyRamp(direct, reversed, &s->StartRampCount, NoLimit, slope * 0.05,
                   [&](int64_t n) { return (n * slope - depth) * 0.05; });
     }
     // Fade-in: tested once per block, so the last fade-in block runs the
     // same law to its end, slightly past 0 dB.
     if (v[FadeInOn] == 1 && s->FadeInCount < s->FadeInLength) {
         const double slope = s->FadeInSlopeDb;
-        ApplyRamp(direct, reversed, &s->FadeInCount,
+        ApplyRamp(direct, reversed, &s->FadeInCount, NoLimit, slope * 0.05,
                   [&](int64_t n) { return (n * slope - depth) * 0.05; });
     }
     // Fade-out: falls to -20 dB and holds there. A zero length (Fade Out
@@ -93,14 +135,8 @@ void ApplyTimerGains(float* direct, float* reversed, int32_t blockIndex) {
     if (v[FadeOutOn] == 1 && static_cast<int64_t>(blockIndex) > s->FadeOutStartBlock &&
         s->FadeOutLength > 0) {
         const double slope = s->FadeOutSlopeDb;
-        const int64_t length = s->FadeOutLength;
-        for (int32_t i = 0; i < BlockFrames; ++i) {
-            s->FadeOutCount += 1;
-            if (s->FadeOutCount > length) s->FadeOutCount = length;
-            const double g = std::pow(10.0, s->FadeOutCount * slope * 0.05);
-            direct[i] = static_cast<float>(g * direct[i]);
-            reversed[i] = static_cast<float>(g * reversed[i]);
-        }
+        ApplyRamp(direct, reversed, &s->FadeOutCount, s->FadeOutLength, slope * 0.05,
+                  [&](int64_t n) { return n * slope * 0.05; });
     }
     if ((v[PlayUntilOn] == 1 || v[AlarmOn] == 1) && static_cast<int64_t>(blockIndex) > s->StopBlock) {
         StopPlayback();

@@ -26,6 +26,7 @@ void SetUpTimersAt(TimePair now, const ControlRecord* settings, SynthRecord* sta
 void SetUpTimers(const ControlRecord* settings, SynthRecord* state);
 
 // Multiplies both channels (8192 floats each) by the start ramp, fade-in
-// and fade-out gains, then runs the stop check, which may call
+// and fade-out gains (each frame's gain 10^x as pow gives it, apart from
+// rare rounding of the float product), then runs the stop check, which may call
 // StopPlayback and StartChime. Called once per block by GenerateBlock.
 void ApplyTimerGains(float* direct, float* reversed, int32_t blockIndex);
