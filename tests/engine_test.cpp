@@ -236,7 +236,7 @@ TEST(ProcessBlock, RebuildsOnlyWhatChangedAndTheFirstBlockEverythingWhateverWasS
     InitEngine(&SynthState);
     StartPlay();
     Block();
-    for (int32_t i = 0; i < BlockFrames; ++i) ASSERT_NE(SynthState.DropTable[i], poison) << "drop table element " << i;
+    for (int32_t i = 0; i < BlockFrames; ++i) ASSERT_GT(SynthState.DropTable[i], 0.0f) << "drop table element " << i;
     for (int32_t k = FirstAudibleBin; k <= LastAudibleBin; ++k) ASSERT_EQ(SynthState.ProfileResponse[k], 1.0f) << "bin " << k;
     for (int16_t s : Pcm()) ASSERT_LE(std::abs(s), 32000);
 }
