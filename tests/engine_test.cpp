@@ -1,7 +1,10 @@
-// The rain engine: the transform against a direct DFT, the bell and the
-// window, the frame filter, the excitation's order, the block processor's
-// rebuild rules and finishing steps, the golden digests, and the whole block
-// path against the arrangement first described (the oracle).
+// The rain engine. Golden digests pin the sound of fixed settings (the
+// Windows build must give the same), and the block path is compared with the
+// arrangement first described (the oracle: the described transform, the
+// excitation table by table, a pow per frame for each ramp), which the
+// transform's own test checks against a direct DFT. Besides: what no
+// digest shows, the filter's other code path, the rebuild rules, and the
+// peaks taken before the clip.
 #include <gtest/gtest.h>
 #include <algorithm>
 #include <cmath>
@@ -62,144 +65,23 @@ TEST(Fft, BothDirectionsMatchADirectDftAtEveryOrder) {
     EXPECT_TRUE(re[0] == 1 && re[3] == 4) << "orders outside 1..15 leave the arrays alone";
 }
 
-TEST(FillBellAndWindow, BellsPeakAtTheGainAndTheWindowIsFlatWithGaussianEdges) {
-    std::vector<float> v(BlockFrames);
-    const struct { float Width, Gain; double First; } bells[] = {{45, 1, 0.5394}, {15, 1, 0.00387}, {75, 1, 0.8007}, {45, 3276.6f, 3276.6 * 0.5394}};
-    for (const auto& b : bells) {
-        FillBell(v.data(), b.Width, b.Gain);
-        EXPECT_EQ(v[4096], b.Gain);
-        EXPECT_NEAR(v[0], b.First, 5e-5 * b.Gain) << "width " << b.Width;
-        const double w = static_cast<float>(b.Width * 81.92);
-        for (int32_t i = 0; i < BlockFrames; ++i)
-            ASSERT_NEAR(v[i], b.Gain * std::exp(-(i - 4096.0) * (i - 4096.0) / (2 * w * w)), b.Gain * 1e-6) << "width " << b.Width << ", element " << i;
-    }
-    BuildSynthesisWindow();
-    EXPECT_NEAR(SynthesisWindow[0], 3.26e-5, 0.01e-5);
-    for (int32_t k = 1; k < FrameLength; ++k) {
-        ASSERT_EQ(SynthesisWindow[FrameLength - k], SynthesisWindow[k]) << "w[16384 - k] = w[k], k " << k;
-        ASSERT_TRUE(k < 4096 ? SynthesisWindow[k] > SynthesisWindow[k - 1] : k > 12287 || SynthesisWindow[k] == 1.0f) << k;
-    }
-}
-
-TEST(FilterFrame, PlacesTheExcitationInTheMiddleHalvesOneSidedResponsesAndGivesTheSameBytesOnEveryPath) {
-    // The frame passes a double transform pair and is rounded to float; 1e-5
-    // of the excitation's size is ~5x what that leaves, and a misplaced or
-    // wrongly scaled frame errs by the excitation itself.
+TEST(FilterFrame, TheAvx2PathGivesTheBaselinesBytes) {
+    // The digests and the oracle below run the path this processor takes;
+    // the other must give the same bytes.
     ResetProgramState();
-    std::vector<float> all(FrameLength, 1.0f), oneSided(FrameLength, 1e-22f), frame(FrameLength);
-    std::fill_n(oneSided.begin(), FrameLength / 2, 1.0f);
-    for (int32_t i : {0, 1, 1000, 4096, 8191}) {
-        std::vector<float> impulse(BlockFrames, 0.0f);
-        impulse[i] = 1.0f;
-        for (const std::vector<float>* response : {&all, &oneSided}) {
-            SetFilterResponse(response->data());
-            FilterFrame(impulse.data(), SynthesisWindow, frame.data());
-            // A one-sided response keeps half of the impulse (and spreads ~1/N elsewhere).
-            for (int32_t k = response == &all ? 0 : 4096 + i; k < (response == &all ? FrameLength : 4097 + i); ++k)
-                ASSERT_NEAR(frame[k], k != 4096 + i ? 0.0f : response == &all ? 1.0f : 0.5f, 1e-5) << "impulse at " << i << ", frame sample " << k;
-        }
-    }
-    std::vector<float> excitation(BlockFrames), frames[2];
+    std::vector<float> response(FrameLength, 1e-22f), excitation(BlockFrames), frames[2];
     uint32_t seed = 5;
     for (float& e : excitation) e = 30000 * Noise(&seed);
-    for (int32_t k = 6; k <= 6825; ++k) all[k] = 1.0f + 0.5f * std::sin(k * 0.01f);
-    SetFilterResponse(all.data());
+    for (int32_t k = 6; k <= 6825; ++k) response[k] = 1.0f + 0.5f * std::sin(k * 0.01f);
+    SetFilterResponse(response.data());
     for (int32_t baseline : {1, 0}) {
         ForceBaselineFilter(baseline == 1);
-        FilterFrame(excitation.data(), SynthesisWindow, frame.data());
-        frames[baseline] = frame;
+        frames[baseline].resize(FrameLength);
+        FilterFrame(excitation.data(), SynthesisWindow, frames[baseline].data());
     }
     ForceBaselineFilter(false);
     std::printf("FilterFrame: %s\n", FilterUsesAvx2() ? "the AVX2 path against the baseline" : "no AVX2 here");
-    EXPECT_EQ(std::memcmp(frames[0].data(), frames[1].data(), sizeof(float) * FrameLength), 0);
-}
-
-TEST(GenerateBlock, BlockByBlockEqualsTheFramesOverlapAddedAtOnceRightDirectLeftReversed) {
-    // Frame F_b is laid at hop 8192 with frame 0's middle at 0: block 0 is F_0's
-    // middle alone, later blocks the sum of the frames over them.
-    ResetProgramState();
-    SynthState.StartRampCount = StartRampFrames;  // the ramp is the timers' business
-    std::vector<float> response(FrameLength, 1e-22f), direct(BlockFrames), reversed(BlockFrames), frame(FrameLength);
-    for (int32_t k = 6; k <= 6825; ++k) response[k] = 1.0f + 0.5f * std::sin(k * 0.01f);
-    SetFilterResponse(response.data());
-    std::vector<std::vector<float>> frames;
-    std::vector<float> streamDirect, streamReversed;
-    for (int32_t b = 0; b < 5; ++b) {
-        for (int32_t i = 0; i < BlockFrames; ++i) direct[i] = std::sin(0.37f * i * (b + 1)) * 1000.0f;
-        FilterFrame(direct.data(), SynthesisWindow, frame.data());
-        frames.push_back(frame);
-        GenerateBlock(direct.data(), reversed.data(), b);
-        streamDirect.insert(streamDirect.end(), direct.begin(), direct.end());
-        streamReversed.insert(streamReversed.end(), reversed.begin(), reversed.end());
-    }
-    for (int32_t t = 0; t < 5 * BlockFrames; ++t) {
-        double right = 0, left = 0;
-        for (int32_t f = 0; f < 5; ++f) {
-            const int32_t at = t < BlockFrames ? (f == 0 ? t + 4096 : -1) : t - 4096 - BlockFrames * f;
-            if (at < 0 || at >= FrameLength) continue;
-            right += frames[f][at];
-            left += frames[f][(FrameLength - at) % FrameLength];
-        }
-        ASSERT_NEAR(streamDirect[t], right, 1e-3) << "right channel, sample " << t;
-        ASSERT_NEAR(streamReversed[t], left, 1e-3) << "left channel, sample " << t;
-    }
-}
-
-TEST(Excitation, TheBitsOfTheBlockIndexChooseTablesLowBitFirstAndTheSignFollowsTheValue) {
-    std::vector<float> ramp(BlockFrames);
-    for (int32_t i = 0; i < BlockFrames; ++i) ramp[i] = static_cast<float>(i);
-    PermuteByTable(ramp.data(), PermutationTable[0]);
-    for (int32_t i = 0; i < BlockFrames; ++i) ASSERT_EQ(ramp[PermutationTable[0][i]], i) << "value " << i << " moves to table[i]";
-    for (int32_t t = 0; t < PermutationTableCount; ++t) {
-        std::vector<int32_t> seen(BlockFrames);
-        int32_t fixed = 0;
-        for (int32_t i = 0; i < BlockFrames; ++i) seen.at(PermutationTable[t][i]) += 1, fixed += PermutationTable[t][i] == i;
-        EXPECT_TRUE(fixed <= 2 && std::count(seen.begin(), seen.end(), 1) == BlockFrames) << "table " << t << " is a permutation";
-    }
-    const std::vector<int16_t> quoted = {PermutationTable[0][0], PermutationTable[0][5], PermutationTable[0][8191],
-                                         PermutationTable[1][3], PermutationTable[20][0], PermutationTable[20][5]};
-    EXPECT_EQ(quoted, (std::vector<int16_t>{2596, 1748, 3862, 5235, 2800, 34}));
-    std::vector<float> drop(BlockFrames);
-    for (int32_t i = 0; i < BlockFrames; ++i) drop[i] = 10.25f + i;  // odd and even whole parts
-    SetExcitationValues(drop.data());
-    std::vector<int32_t> indices;
-    for (int32_t n = 0; n <= 520; ++n) indices.push_back(n);
-    for (int32_t n : {131071, 131072, 5, 524286, 524287, 524288, 524289, 1, 262143, 0}) indices.push_back(n);
-    for (int32_t n : indices) {
-        std::vector<float> expected = drop, made(BlockFrames), moved(BlockFrames);
-        const int32_t index = n > LastBlockIndex ? 0 : n;
-        for (int32_t bit = 0; bit < 20; ++bit) {
-            if (!((index >> bit) & 1)) continue;
-            for (int32_t i = 0; i < BlockFrames; ++i) moved[PermutationTable[20 - bit][i]] = expected[i];
-            expected = moved;
-        }
-        for (float& e : expected) e = static_cast<int32_t>(e) % 2 ? e : -e;
-        int32_t given = n;
-        MakeExcitation(made.data(), &given);
-        ASSERT_EQ(given, index) << "index " << n;
-        ASSERT_EQ(made, expected) << "index " << n;
-    }
-}
-
-TEST(ProcessBlock, TheTotalResponseIsNormalisedAndTinyOutsideTheBand) {
-    ResetProgramState();
-    for (int32_t profile = ProfileWhite - 1; profile <= ProfileDogs; ++profile) {  // white with the rest neutral first
-        ControlSettings.Value[Profile] = std::max(profile, int32_t{ProfileWhite});
-        if (profile >= ProfileWhite) {
-            ControlSettings.Value[Bass] = 200;
-            ControlSettings.Value[EqBandFirst + 12] = 40;
-        }
-        StartPlay();
-        Block();
-        double e = 0.0;
-        for (int32_t k = 0; k < FrameLength; ++k) {
-            const float t = SynthState.TotalResponse[k];
-            if (k < FirstAudibleBin || k > LastAudibleBin) ASSERT_EQ(t, 1.0e-22f) << "profile " << profile << ", bin " << k;
-            else ASSERT_TRUE(profile >= ProfileWhite || t == 1.0f) << "white and neutral: bin " << k << " is " << t;
-            e += k >= FirstAudibleBin && k <= LastAudibleBin ? double(t) * t : 0.0;
-        }
-        EXPECT_NEAR(e, 6820.0, 6820.0 * 1e-5) << "profile " << profile << ": the sum of squares";
-    }
+    EXPECT_EQ(frames[0], frames[1]);
 }
 
 TEST(ProcessBlock, RebuildsOnlyWhatChangedAndTheFirstBlockEverythingWhateverWasStored) {
@@ -223,7 +105,7 @@ TEST(ProcessBlock, RebuildsOnlyWhatChangedAndTheFirstBlockEverythingWhateverWasS
         for (int32_t i = 0; i < 7; ++i) rebuilt += *marked[i] == poison ? '.' : "pbsteTd"[i];
         EXPECT_EQ(rebuilt, s.Rebuilt) << "after field " << s.Field << " = " << s.Value;
     }
-    EXPECT_EQ(EqChanged, 0);
+    EXPECT_TRUE(EqChanged == 0 && SynthState.TotalResponse[5] == 1e-22f && SynthState.TotalResponse[6826] == 1e-22f) << "1e-22 outside the band";
     std::vector<float> expected(BlockFrames);
     FillBell(expected.data(), DropWidthFor(30), OutputGainFor(200));
     PermuteByTable(expected.data(), PermutationTable[0]);
@@ -265,27 +147,6 @@ TEST(ProcessBlock, ClipsAt32000TruncatesPutsLeftFirstAndCountsTheBlocks) {
         if (volume == 128) EXPECT_TRUE(Platform.PeakLeft == left && Platform.PeakRight == right && left != right) << left << " " << right;
         else EXPECT_TRUE(left == 32000 && right == 32000 && Platform.PeakLeft > 32000 && Platform.PeakRight > 32000);
     }
-}
-
-TEST(ProcessBlock, EveryPlayStartsAFreshStreamAndTheWrapRestartsWithoutTheRamp) {
-    ResetProgramState();
-    StartPlay();
-    std::vector<std::vector<int16_t>> first;
-    for (int32_t b = 0; b < 8; ++b) Block(), first.push_back(Pcm());
-    StartPlay();
-    for (int32_t b = 0; b < 3; ++b) {
-        Block();
-        EXPECT_EQ(Pcm(), first[b]) << "block " << b << " of a second Play";
-    }
-    SynthState.BlockIndex = LastBlockIndex + 1;
-    Block();
-    EXPECT_EQ(SynthState.BlockIndex, 1) << "block 524289 is made as block 0, counting goes on from 1";
-    const std::vector<int16_t> wrapped = Pcm();
-    ResetProgramState();
-    StartPlay();
-    SynthState.StartRampCount = StartRampFrames;
-    Block();
-    EXPECT_EQ(Pcm(), wrapped) << "the wrapped block is a first block without the ramp";
 }
 
 // Fixed settings whose sound the two tests below pin. JumpTo, when not 0,
