@@ -34,7 +34,6 @@ void BuildSynthesisWindow() {
 namespace {
 
 typedef float Float4 __attribute__((vector_size(16)));
-typedef int32_t Int4 __attribute__((vector_size(16)));
 
 Float4 Load4(const float* p) {
     Float4 v;
@@ -45,7 +44,7 @@ Float4 Load4(const float* p) {
 void Store4(float* p, Float4 v) { __builtin_memcpy(p, &v, sizeof v); }
 
 // p[0], p[-1], p[-2], p[-3]: four samples of the reversed frame.
-Float4 Load4Reversed(const float* p) { return __builtin_shuffle(Load4(p - 3), Int4{3, 2, 1, 0}); }
+Float4 Load4Reversed(const float* p) { return __builtin_shufflevector(Load4(p - 3), Load4(p - 3), 3, 2, 1, 0); }
 
 }  // namespace
 
