@@ -123,15 +123,9 @@ TEST(ProcessBlock, RebuildsOnlyWhatChangedAndTheFirstBlockEverythingWhateverWasS
     for (int16_t s : Pcm()) ASSERT_LE(std::abs(s), 32000);
 }
 
-TEST(ProcessBlock, ClipsAt32000TruncatesPutsLeftFirstAndCountsTheBlocks) {
-    std::vector<float> direct(BlockFrames, 0.0f), reversed(BlockFrames, 0.0f);
-    std::vector<int16_t> pcm(BlockFrames * 2);
-    const float in[] = {40000.7f, -40000.0f, 32000.0f, 32000.5f, -32000.9f, -31999.9f, 0.9f, -0.9f, 2.9f, -2.9f};
-    const int16_t out[] = {32000, -32000, 32000, 32000, -32000, -31999, 0, 0, 2, -2};
-    for (int32_t i = 0; i < 10; ++i) direct[i] = in[i], reversed[i] = -in[i];  // right is direct, left reversed
-    ClipAndConvert(direct.data(), reversed.data(), pcm.data());
-    for (int32_t i = 0; i < 10; ++i)
-        EXPECT_TRUE(pcm[2 * i + 1] == out[i] && pcm[2 * i] == -out[i]) << in[i] << " gave right " << pcm[2 * i + 1] << ", left " << pcm[2 * i];
+// The clip, the truncation and the channel order show in the digests (the
+// full-volume case clips); the peaks the meter gets are taken before the clip.
+TEST(ProcessBlock, TheMetersPeaksAreEachChannelsBeforeTheClipAndTheBlocksAreCounted) {
     for (int32_t volume : {128, 255}) {  // the meter's peaks per channel, taken before the clip
         ResetProgramState();
         ControlSettings.Value[Attenuator] = volume;

@@ -1,13 +1,17 @@
-// sombrel-screenshots: puts Sombrel.exe, started fresh, into each state the
-// manual pictures and asks the harness (scripts/screenshots) to photograph
-// the display: the window with its frame, and a message box it shows.
+// sombrel-drive: works Sombrel.exe, started fresh, as a user does, with the
+// program tests' harness.
 //
-//   usage: sombrel-screenshots SOMBREL.EXE EQ-SETTING
-//
-// Each picture is one "screenshot" request (in SOMBREL_WORK's requests)
-// holding the screen area and the picture's name. EQ-SETTING is the example
-// equaliser setting (31 band slider values, comma-separated) that the
-// manual also plots. Works the program with the program tests' harness.
+//   sombrel-drive screenshots SOMBREL.EXE EQ-SETTING
+//     puts the program into each state the manual pictures and asks the
+//     harness (scripts/screenshots) to photograph the display: the window
+//     with its frame, and a message box it shows. Each picture is one
+//     "screenshot" request (in SOMBREL_WORK's requests) holding the screen
+//     area and the picture's name. EQ-SETTING is the example equaliser
+//     setting (31 band slider values, comma-separated) the manual plots.
+//   sombrel-drive figures SOMBREL.EXE SECONDS
+//     for scripts/measure-program: prints "time-to-window-ms N" once the
+//     window shows, presses Play, prints "playing-pid N", plays SECONDS,
+//     then stops and closes the program.
 #include <windows.h>
 #include <cstdio>
 #include <cstdlib>
@@ -34,7 +38,7 @@ std::string Area() {
 bool Shoot(const char* name) {
     PumpUntil([] { return false; }, 700);  // the repaints the last action asked for reach the screen
     const bool taken = AskHarness("screenshot", Area() + " " + name);
-    if (!taken) std::fprintf(stderr, "sombrel-screenshots: no picture \"%s\"\n", name);
+    if (!taken) std::fprintf(stderr, "sombrel-drive: no picture \"%s\"\n", name);
     return taken;
 }
 
@@ -53,15 +57,29 @@ COLORREF PixelAt(int32_t x, int32_t y) {
     ReleaseDC(nullptr, screen);
     return pixel;
 }
+
+// Starts the program, plays it for `seconds` and closes it.
+int Figures(const char* exe, double seconds) {
+    const ULONGLONG start = GetTickCount64();
+    if (!Launch(&P, WindowsPath(exe))) return 1;
+    std::printf("time-to-window-ms %llu\n", GetTickCount64() - start);
+    if (!Click(P, 1030)) return 1;
+    std::printf("playing-pid %lu\n", P.Process.dwProcessId);
+    std::fflush(stdout);
+    Sleep(static_cast<DWORD>(seconds * 1000));
+    return Click(P, 1031) && Close(&P) == 0 ? 0 : 1;
+}
 }  // namespace
 
 int main(int argc, char** argv) {
-    if (argc != 3) {
-        std::fprintf(stderr, "usage: sombrel-screenshots SOMBREL.EXE EQ-SETTING\n");
+    const std::string mode = argc == 4 ? argv[1] : "";
+    if (mode == "figures") return Figures(argv[2], std::atof(argv[3]));
+    if (mode != "screenshots") {
+        std::fprintf(stderr, "usage: sombrel-drive screenshots SOMBREL.EXE EQ-SETTING\n       sombrel-drive figures SOMBREL.EXE SECONDS\n");
         return 2;
     }
-    if (!Launch(&P, WindowsPath(argv[1]))) {
-        std::fprintf(stderr, "sombrel-screenshots: %s showed no window\n", argv[1]);
+    if (!Launch(&P, WindowsPath(argv[2]))) {
+        std::fprintf(stderr, "sombrel-drive: %s showed no window\n", argv[2]);
         return 1;
     }
     bool ok = Shoot("main");
@@ -76,7 +94,7 @@ int main(int argc, char** argv) {
     // down so the readouts show the 20 Hz band. Opening it locks it.
     Click(P, 1055);
     Click(P, 1057);
-    const char* text = argv[2];
+    const char* text = argv[3];
     int32_t bands[31];
     for (int32_t k = 0; k < 31; ++k) {
         char* end = nullptr;
