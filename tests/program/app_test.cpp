@@ -832,7 +832,7 @@ std::string Marker() { return WorkDir() + "\\opened.txt"; }
 bool Opened() { return GetFileAttributesA(Marker().c_str()) != INVALID_FILE_ATTRIBUTES; }
 HWND Volume(const Program& p) { return FindWindowExA(p.Window, nullptr, "ScrollBar", nullptr); }
 
-TEST(Launch, HelpOpensTheManualBesideTheProgramOrSaysNothingAndARunWithPlayStoresTheSettingsForTheNextStart) {
+TEST(Launch, HelpOpensTheManualBesideTheProgramOrSaysNothingAndARunWithPlayStoresTheSettingsForTheNextStartWithoutTheMachineKey) {
     char self[MAX_PATH];
     GetModuleFileNameA(nullptr, self, sizeof(self));
     const std::string command = std::string("\"") + self + "\" --mark-opened \"" + Marker() + "\" \"%1\"";
@@ -845,6 +845,7 @@ TEST(Launch, HelpOpensTheManualBesideTheProgramOrSaysNothingAndARunWithPlayStore
     ASSERT_TRUE(Launch(&p, Exe)) << Exe;
     EXPECT_EQ(Close(&p), 0);
     EXPECT_FALSE(KeyExists()) << "a run without Play stored the settings";
+    ASSERT_TRUE(DenyKey(HKEY_LOCAL_MACHINE));  // as for a standard user on Windows
     for (const std::string& exe : {Exe, alone + "\\Sombrel.exe"}) {
         DeleteFileA(Marker().c_str());
         ASSERT_TRUE(Launch(&p, exe)) << exe;
@@ -870,8 +871,9 @@ TEST(Launch, HelpOpensTheManualBesideTheProgramOrSaysNothingAndARunWithPlayStore
         }
         EXPECT_TRUE(Click(p, 1030) && (exe == Exe || Click(p, 1031))) << "Play, and Stop after the second start";
         EXPECT_EQ(Close(&p), 0) << (exe == Exe ? "closed while playing" : "closed after Stop");
+        EXPECT_TRUE(exe != Exe || Boxes.empty()) << "boxes at the close: " << (Boxes.empty() ? "" : Boxes[0].Text);
         Boxes.clear();  // the shell's, if any
-        EXPECT_EQ(ReadNumber("Attenuator"), 200) << "the settings stored at the end of a run with Play";
+        EXPECT_EQ(ReadNumber("Attenuator", HKEY_CURRENT_USER), 200) << "the settings stored in the user's key at the end of a run with Play";
     }
     RegDeleteTreeA(HKEY_CLASSES_ROOT, "SombrelTestPdf");
     RegDeleteTreeA(HKEY_CLASSES_ROOT, ".pdf");
