@@ -127,17 +127,6 @@ bool StoreNumber(const char* name, int32_t number, HKEY hive) {
     return StoreRaw(name, REG_DWORD, text, 4, hive);
 }
 
-int32_t ReadNumber(const char* name, HKEY hive) {
-    char data[8] = {};
-    DWORD type = 0, length = 4;
-    HKEY key = nullptr;
-    if (RegOpenKeyExA(hive, KeyName, 0, KEY_QUERY_VALUE, &key) != ERROR_SUCCESS) return -99999;
-    const bool read = RegQueryValueExA(key, name, nullptr, &type, reinterpret_cast<BYTE*>(data), &length) ==
-                      ERROR_SUCCESS;
-    RegCloseKey(key);
-    return read && type == REG_DWORD && length == 4 && data[0] != 0 ? std::atoi(data) : -99999;
-}
-
 std::string RawValue(const char* name, HKEY hive) {
     BYTE data[64];
     DWORD type = 0, length = sizeof(data);

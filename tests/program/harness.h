@@ -63,7 +63,6 @@ bool ForgetStoredSettings();                                   // both keys gone
 bool KeyExists(HKEY hive = HKEY_LOCAL_MACHINE);
 bool StoreRaw(const char* name, DWORD type, const void* data, DWORD length, HKEY hive = HKEY_LOCAL_MACHINE);
 bool StoreNumber(const char* name, int32_t number, HKEY hive = HKEY_LOCAL_MACHINE);  // as the program stores it
-int32_t ReadNumber(const char* name, HKEY hive = HKEY_LOCAL_MACHINE);  // -99999 when missing or not a number
 std::string RawValue(const char* name, HKEY hive = HKEY_LOCAL_MACHINE);  // "type: bytes in hex", "" when missing
 int32_t ValueCount(HKEY hive = HKEY_LOCAL_MACHINE);
 bool DenyKey(HKEY hive = HKEY_LOCAL_MACHINE);                  // an empty access list: nobody may write
