@@ -8,9 +8,8 @@
 
 inline std::string ExpectedStoredName(int32_t index) {
     static const char* const head[5] = {"Attenuator", "Hardness", "Bass", "SubBass", "Treble"};
-    static const char* const tail[11] = {"PlayUntilOn", "AlarmOn",   "Alarm_PM",  "Alarm_AM",
-                                         "Alarm_Hr",    "Alarm_Min", "Profile",   "FadeInOn",
-                                         "FadeOutOn",   "FadeInTime", "FadeOutTime"};
+    static const char* const tail[11] = {"PlayUntilOn", "AlarmOn", "Alarm_PM", "Alarm_AM", "Alarm_Hr", "Alarm_Min",
+                                         "Profile", "FadeInOn", "FadeOutOn", "FadeInTime", "FadeOutTime"};
     if (index < 5) return head[index];
     if (index < 36) return std::to_string(index - 5);          // M1 bands: "0".."30"
     if (index < 67) return std::to_string(100 + index - 36);   // M2 bands: "100".."130"

@@ -12,7 +12,7 @@ work=$(mktemp -d) && trap 'rm -rf "$work"' EXIT && cd "$work" || exit 1
 passed=0 failed=0
 check() { if eval "$2"; then passed=$((passed + 1)); else failed=$((failed + 1)); echo "FAIL: $1"; fi; }
 render() { "${tool[@]}" "$@" 2>err.txt </dev/null; }
-u32() { od -An -tu4 -j "$2" -N4 "$1" | tr -d ' '; }
+u32() { od -An -tu4 -j "$2" -N4 "$1" | tr -d ' '; }  # FILE OFFSET: the little-endian number there
 u16() { od -An -tu2 -j "$2" -N2 "$1" | tr -d ' '; }
 peak() { od -An -td2 -v -j 44 "$1" | tr -s ' ' '\n' | tr -d - | sort -n | tail -1; }
 

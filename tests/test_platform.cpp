@@ -9,17 +9,12 @@ PlatformCalls Platform;
 
 void StopPlayback() { Platform.Stops += 1; }
 void StartChime() { Platform.Chimes += 1; }
-
 void UpdatePeaks(const float* right, const float* left) {
     Platform.PeakUpdates += 1;
     Platform.PeakRight = PeakMagnitude(right, BlockFrames);
     Platform.PeakLeft = PeakMagnitude(left, BlockFrames);
 }
-
-void ReadLocalClock(int32_t* hour, int32_t* minute) {
-    *hour = Platform.ClockHour;
-    *minute = Platform.ClockMinute;
-}
+void ReadLocalClock(int32_t* hour, int32_t* minute) { *hour = Platform.ClockHour, *minute = Platform.ClockMinute; }
 
 void ResetProgramState() {
     Platform = PlatformCalls{};

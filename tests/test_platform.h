@@ -4,17 +4,11 @@
 #include <cstdint>
 
 struct PlatformCalls {
-    int32_t Stops;          // StopPlayback calls
-    int32_t Chimes;         // StartChime calls
-    int32_t PeakUpdates;    // UpdatePeaks calls
-    int32_t PeakRight;      // peaks of the last UpdatePeaks, truncated
-    int32_t PeakLeft;
-    int32_t ClockHour;      // what ReadLocalClock answers
-    int32_t ClockMinute;
+    int32_t Stops, Chimes, PeakUpdates;  // calls of StopPlayback, StartChime and UpdatePeaks
+    int32_t PeakRight, PeakLeft;         // peaks of the last UpdatePeaks, truncated
+    int32_t ClockHour, ClockMinute;      // what ReadLocalClock answers
 };
-
 extern PlatformCalls Platform;
 
-// Start values for the engine and the control record, as at program start,
-// and a cleared call record.
+// Start values for the engine and the controls, and a cleared call record.
 void ResetProgramState();

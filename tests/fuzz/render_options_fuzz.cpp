@@ -2,6 +2,7 @@
 // Bad input gives one line naming an option or argument; accepted input
 // leaves every setting in its control's range and a length the tool can write.
 #include <cstdlib>
+#include <sstream>
 #include <string>
 #include <vector>
 #include "engine/synth_state.h"
@@ -13,14 +14,8 @@ bool Within(int32_t v, int32_t low, int32_t high) { return v >= low && v <= high
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* input, size_t size) {
     std::vector<std::string> words{"sombrel-render"};
-    std::string word;
-    for (size_t i = 0; i < size; ++i) {
-        if (input[i] != 0) word += static_cast<char>(input[i]);
-        if (input[i] == 0 || i + 1 == size) {
-            words.push_back(word);
-            word.clear();
-        }
-    }
+    std::istringstream in(std::string(reinterpret_cast<const char*>(input), size));
+    for (std::string word; std::getline(in, word, '\0');) words.push_back(word);
     std::vector<const char*> argv;
     for (const std::string& w : words) argv.push_back(w.c_str());
     RenderOptions o;

@@ -14,11 +14,10 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* input, size_t size) {
     const std::vector<uint8_t> data(input + 2, input + size);
     const uint32_t length = static_cast<uint32_t>(data.size());
     int32_t number = 0;
-    if (AcceptStoredData(index, true, type, data.data(), length, &number)) {
-        const StoredValue row = StoredValueAt(index);
-        if (type != StoredValueType || length != StoredValueBytes || number < row.Low || number > row.High)
-            std::abort();
-    }
+    const StoredValue row = StoredValueAt(index);
+    if (AcceptStoredData(index, true, type, data.data(), length, &number) &&
+        (type != StoredValueType || length != StoredValueBytes || number < row.Low || number > row.High))
+        std::abort();
     // Four characters say at most -999 .. 9999.
     if (DecodeStoredNumber(data.data(), length, &number) && (number < -999 || number > 9999)) std::abort();
     char text[5];

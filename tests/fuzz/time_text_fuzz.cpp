@@ -3,14 +3,12 @@
 // a text of digits and full stops it is what the C library's conversion,
 // truncated, gives.
 #include <cstdlib>
-#include <cstring>
 #include <string>
 #include "timers/time_text.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* input, size_t size) {
-    const std::string field(reinterpret_cast<const char*>(input), size);
-    const std::string checked = field.substr(0, std::strlen(field.c_str())).substr(0, 2);
-    const std::string read = field.substr(0, std::strlen(field.c_str())).substr(0, 4);
+    const std::string field = std::string(reinterpret_cast<const char*>(input), size).c_str();  // up to a NUL
+    const std::string checked = field.substr(0, 2), read = field.substr(0, 4);
     CheckTimeText(checked.c_str());
     const int32_t value = TimeTextValue(read.c_str());
     if (value < 0 || value > 9999) std::abort();
