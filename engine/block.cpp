@@ -45,9 +45,7 @@ void InitEngine(SynthRecord* state) {
     FillFloats(state->SubBassResponse, 1.0f, FrameLength);
     FillFloats(state->TrebleResponse, 1.0f, FrameLength);
     FillFloats(state->TotalResponse, 1.0f, FrameLength);
-    SetFilterResponse(state->TotalResponse);
     ZeroFloats(state->DropTable, BlockFrames);
-    SetExcitationValues(state->DropTable);
     InitEqResponse(state);
     BuildSynthesisWindow();
     state->RampDepthDb = 20.0f;
@@ -107,8 +105,8 @@ void BuildTotalResponse(SynthRecord* state) {
 }
 
 void ClipAndConvert(float* direct, float* reversed, int16_t* pcm) {
-    // Four frames at a time. max(-32000, x) and min(32000, x) are exactly
-    // "below -32000 becomes -32000, above 32000 becomes 32000". The
+    // Four frames at a time. max(-32000, x) and min(32000, x) clip exactly:
+    // below -32000 becomes -32000, above 32000 becomes 32000. The
     // conversion truncates toward zero as a cast does; the saturating pack
     // changes nothing, all values being clipped.
     const __m128 low = _mm_set1_ps(-ClipLevel), high = _mm_set1_ps(ClipLevel);

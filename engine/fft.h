@@ -1,8 +1,8 @@
 // engine/fft.h: in-place complex FFT on split float arrays.
 //
-// The transform as first described, radix-2 in single precision. The block
-// path has its own real-input route (engine/block_filter.h); the tests keep
-// this one as that route's oracle.
+// A plain radix-2 transform in single precision. The block path has its own
+// real-input route (engine/block_filter.h); the tests keep this one as that
+// route's reference.
 //
 // Conventions:
 //   forward  X[k] = sum x[n] e^(-2 pi i nk/N), unscaled

@@ -15,8 +15,8 @@ void PermuteByTable(float* values, const int16_t* table);
 
 // Wraps *blockIndex to 0 when above 524288, applies table 20 - b for every
 // set bit b of it (bit 0 first), then negates every value whose integer
-// part is even. values: 8192 floats, in and out. The rule as stated, table
-// by table; the block path uses MakeExcitation.
+// part is even. values: 8192 floats, in and out. Table by table, as the
+// tests' reference; the block path uses MakeExcitation.
 void ShuffleExcitation(float* values, int32_t* blockIndex);
 
 // Keeps a copy of the drop table (8192 floats) with the sign rule applied.

@@ -10,11 +10,6 @@ namespace {
 
 constexpr int32_t MinutesPerDay = 1440;
 
-// Blocks in `minutes` of sound, rounded down: minutes * 351.5625, exact in double.
-int64_t BlocksIn(int32_t minutes) {
-    return static_cast<int64_t>(minutes * static_cast<double>(FramesPerMinute) * (1.0 / BlockFrames));
-}
-
 // A ramp's gains 10^x(n), x linear in the frame count n, form a geometric
 // sequence: each is the one before times 10^(dx). pow anchors the sequence
 // at the first frame of every run of RampAnchorFrames, so that the drift of
@@ -24,9 +19,6 @@ int64_t BlocksIn(int32_t minutes) {
 // other.
 constexpr int32_t RampAnchorFrames = 512;
 
-// Multiplies both channels frame by frame by 10^x(count), the same gain for
-// both; count advances once per frame before x is taken from it, but not
-// past limit, where the gain holds.
 typedef double Double4 __attribute__((vector_size(32)));
 typedef float Float4 __attribute__((vector_size(16)));
 
@@ -38,6 +30,9 @@ void Scale4(float* samples, Double4 g) {
     __builtin_memcpy(samples, &v, sizeof v);
 }
 
+// Multiplies both channels frame by frame by 10^x(count), the same gain for
+// both; count advances once per frame before x is taken from it, but not
+// past limit, where the gain holds.
 template <typename GainExponent>
 void ApplyRamp(float* direct, float* reversed, int64_t* count, int64_t limit, double dx, GainExponent exponent) {
     const int32_t running = static_cast<int32_t>(std::min<int64_t>(BlockFrames, std::max<int64_t>(0, limit - *count)));
@@ -60,6 +55,7 @@ void ApplyRamp(float* direct, float* reversed, int64_t* count, int64_t limit, do
         }
     }
     *count += running;
+    if (running == BlockFrames) return;
     const double held = std::pow(10.0, exponent(*count));
     for (int32_t i = running; i < BlockFrames; ++i) {
         direct[i] = static_cast<float>(held * direct[i]);

@@ -5,6 +5,12 @@
 #include "app/control_settings.h"
 #include "engine/synth_state.h"
 
+// Blocks in `minutes` of sound, rounded down: minutes * 351.5625, exact in
+// double. Inline, so the render tool's options need nothing else of the timers.
+inline int64_t BlocksIn(int32_t minutes) {
+    return static_cast<int64_t>(minutes * static_cast<double>(FramesPerMinute) * (1.0 / BlockFrames));
+}
+
 struct TimePair {
     int32_t Hours;
     int32_t Minutes;

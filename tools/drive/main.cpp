@@ -16,6 +16,8 @@
 #include <cstdio>
 #include <cstdlib>
 #include <string>
+#include "app/control_settings.h"
+#include "app/ids.h"
 #include "tests/program/harness.h"
 
 namespace {
@@ -63,11 +65,11 @@ int Figures(const char* exe, double seconds) {
     const ULONGLONG start = GetTickCount64();
     if (!Launch(&P, WindowsPath(exe))) return 1;
     std::printf("time-to-window-ms %llu\n", GetTickCount64() - start);
-    if (!Click(P, 1030)) return 1;
+    if (!Click(P, PlayId)) return 1;
     std::printf("playing-pid %lu\n", P.Process.dwProcessId);
     std::fflush(stdout);
     Sleep(static_cast<DWORD>(seconds * 1000));
-    return Click(P, 1031) && Close(&P) == 0 ? 0 : 1;
+    return Click(P, StopId) && Close(&P) == 0 ? 0 : 1;
 }
 }  // namespace
 
@@ -85,15 +87,15 @@ int main(int argc, char** argv) {
     bool ok = Shoot("main");
 
     // Playing, once the meter shows the first block's bars.
-    Click(P, 1030);
+    Click(P, PlayId);
     ok = PumpUntil([] { return PixelAt(20, 5) != PixelAt(20, 1); }, 10000) && ok;
     ok = Shoot("playing") && ok;
-    Click(P, 1031);
+    Click(P, StopId);
 
     // The equaliser panel with the example setting, set from the top band
     // down so the readouts show the 20 Hz band. Opening it locks it.
-    Click(P, 1055);
-    Click(P, 1057);
+    Click(P, EqPanelId);
+    Click(P, EqLockId);
     const char* text = argv[3];
     int32_t bands[31];
     for (int32_t k = 0; k < 31; ++k) {
@@ -102,24 +104,24 @@ int main(int argc, char** argv) {
         text = *end == ',' ? end + 1 : end;
     }
     for (int32_t k = 30; k >= 0; --k)
-        Send(P.Window, WM_VSCROLL, MAKEWPARAM(SB_THUMBPOSITION, bands[k]), reinterpret_cast<LPARAM>(GetDlgItem(P.Window, 5 + k)));
+        Send(P.Window, WM_VSCROLL, MAKEWPARAM(SB_THUMBPOSITION, bands[k]), reinterpret_cast<LPARAM>(GetDlgItem(P.Window, EqBandFirst + k)));
     ok = Shoot("equaliser") && ok;
-    Click(P, 1069);
+    Click(P, EqCloseId);
 
     // The timers: stop at 7:30 AM with the alarm, fading in over 10 minutes
     // and out over the last 15; a click into the fade-out field takes the
     // focus rectangle away from the last button clicked.
-    for (int32_t id : {1038, 1035, 1032, 1039, 1040}) Click(P, id);
-    for (const auto& field : {std::make_pair(1033, "7"), std::make_pair(1034, "30"), std::make_pair(1041, "10"), std::make_pair(1042, "15")})
+    for (int32_t id : {StopTimeId, AmId, AlarmId, FadeInId, FadeOutId}) Click(P, id);
+    for (const auto& field : {std::make_pair(HourFieldId, "7"), std::make_pair(MinuteFieldId, "30"), std::make_pair(FadeInFieldId, "10"), std::make_pair(FadeOutFieldId, "15")})
         Type(field.first, field.second);
-    for (UINT message : {WM_LBUTTONDOWN, WM_LBUTTONUP}) Send(GetDlgItem(P.Window, 1042), message, message == WM_LBUTTONDOWN, MAKELPARAM(20, 10));
+    for (UINT message : {WM_LBUTTONDOWN, WM_LBUTTONUP}) Send(GetDlgItem(P.Window, FadeOutFieldId), message, message == WM_LBUTTONDOWN, MAKELPARAM(20, 10));
     ok = Shoot("timers") && ok;
 
     // An hour out of range: the box over the middle of the window, where
     // Windows puts it (Wine centres it on the screen), and the hour field
     // red behind it.
-    Type(1033, "13");
-    PostMessageA(GetDlgItem(P.Window, 1030), BM_CLICK, 0, 0);
+    Type(HourFieldId, "13");
+    PostMessageA(GetDlgItem(P.Window, PlayId), BM_CLICK, 0, 0);
     if (PumpUntil([] { return !OpenBoxes(P).empty() && ReadBox(OpenBoxes(P)[0]).Buttons > 0; }, 20000)) {
         HWND box = OpenBoxes(P)[0];
         RECT w, b, field;
@@ -127,7 +129,7 @@ int main(int argc, char** argv) {
         GetWindowRect(box, &b);
         SetWindowPos(box, nullptr, (w.left + w.right - (b.right - b.left)) / 2, (w.top + w.bottom - (b.bottom - b.top)) / 2, 0, 0,
                      SWP_NOSIZE | SWP_NOZORDER);
-        HWND hour = GetDlgItem(P.Window, 1033);
+        HWND hour = GetDlgItem(P.Window, HourFieldId);
         GetWindowRect(hour, &field);
         MapWindowPoints(nullptr, P.Window, reinterpret_cast<POINT*>(&field), 2);
         RedrawWindow(hour, nullptr, nullptr, RDW_INVALIDATE | RDW_ERASE | RDW_FRAME);

@@ -5,6 +5,7 @@
 #include <cstring>
 
 #include "engine/synth_state.h"
+#include "timers/timer_gains.h"
 
 const char RenderUsage[] =
     "usage: sombrel-render --out FILE [options]\n"
@@ -192,10 +193,10 @@ bool ParseRenderOptions(int argc, const char* const* argv, RenderOptions* option
         v[Alarm_Hr] = static_cast<int32_t>(stopAfter / 60);
         v[Alarm_Min] = static_cast<int32_t>(stopAfter % 60);
         // The stop rule ends the render after the block whose index is
-        // floor(minutes * 351.5625), counting from the first block's index
-        // (an index past the cycle starts over at 0).
+        // BlocksIn(minutes), counting from the first block's index (an
+        // index past the cycle starts over at 0).
         const int64_t first = o.StartIndex > LastBlockIndex ? 0 : o.StartIndex;
-        const int64_t untilStop = static_cast<int64_t>(stopAfter * 351.5625) + 1 - first;
+        const int64_t untilStop = BlocksIn(static_cast<int32_t>(stopAfter)) + 1 - first;
         const int64_t blocks = untilStop < 1 ? 0 : untilStop;
         if (lengthOption == nullptr || blocks < o.Blocks) {
             o.Blocks = blocks;
