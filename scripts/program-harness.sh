@@ -1,24 +1,18 @@
-# scripts/program-harness.sh: sourced by scripts/test-program and
-# scripts/measure-program. Starts a virtual X display, a PulseAudio server
-# with a null sink at 48 000 Hz s16le and a throw-away Wine prefix, all
-# under $work, and ends them again by pid when the script exits.
-# The sourcing script sets root, work, wine_run and failed (a count this
-# file adds to when something cannot be started); harness_up returns
-# non-zero when something did not start.
-
-xvfb_pid=""
-pulse_pid=""
-parec_pid=""
+# scripts/program-harness.sh: sourced by scripts/test-program,
+# scripts/screenshots and scripts/measure-program. Starts a virtual X
+# display, a PulseAudio server with a null sink at 48 000 Hz s16le and a
+# throw-away Wine prefix, all under $work, and ends them again by pid when
+# the script exits. The sourcing script sets root, work, wine_run and failed
+# (a count this file adds to when something cannot be started).
+xvfb_pid="" pulse_pid="" parec_pid=""
 
 say() { printf '%s\n' "$*"; }
 fail_setup() { say "$(basename "$0"): $*"; failed=$((failed + 1)); }
 
-stop_pid() {
-  local pid=$1
-  [ -n "$pid" ] || return 0
-  kill "$pid" 2>/dev/null || return 0
-  for _ in $(seq 50); do kill -0 "$pid" 2>/dev/null || return 0; sleep 0.1; done
-  kill -9 "$pid" 2>/dev/null
+stop_pid() {  # asks, then after 5 s forces
+  [ -n "$1" ] && kill "$1" 2>/dev/null || return 0
+  for _ in $(seq 50); do kill -0 "$1" 2>/dev/null || return 0; sleep 0.1; done
+  kill -9 "$1" 2>/dev/null
 }
 
 cleanup() {
@@ -39,29 +33,34 @@ start_pulse() {
     >"$work/pulseaudio.log" 2>&1 &
   pulse_pid=$!
   for _ in $(seq 100); do
-    if pactl info >/dev/null 2>&1; then
-      pactl set-default-sink capture
-      return 0
-    fi
-    kill -0 "$pulse_pid" 2>/dev/null || break
+    pactl info >/dev/null 2>&1 && { pactl set-default-sink capture; return 0; }
+    kill -0 "$pulse_pid" 2>/dev/null || return 1
     sleep 0.1
   done
   return 1
 }
 
-stop_pulse() {
-  stop_pid "$pulse_pid"
-  pulse_pid=""
+# answer_requests PID ON_PICTURE: while PID runs, answers the screenshot
+# requests its Windows side leaves ("AREA NAME [REST]" in
+# $work/requests/screenshot): AREA of the display goes into $work/NAME.png,
+# stripped of the dates ImageMagick would write into it, then ON_PICTURE
+# NAME [REST] is called.
+answer_requests() {
+  local request=$work/requests/screenshot area name rest
+  while kill -0 "$1" 2>/dev/null; do
+    if [ -e "$request" ]; then
+      read -r area name rest <"$request"
+      import -window root -crop "$area" +repage -strip "$work/$name.png"
+      "$2" "$name" $rest
+      mv "$request" "$request.done"
+    fi
+    sleep 0.1
+  done
 }
 
 harness_up() {
-  rm -rf "$work"
-  mkdir -p "$work/requests" "$work/runtime"
-  export WINEPREFIX=$work/prefix
-  export WINEDEBUG=-all
-  export WINEDLLOVERRIDES="mscoree,mshtml="
-  export XDG_RUNTIME_DIR=$work/runtime
-
+  rm -rf "$work" && mkdir -p "$work/requests" "$work/runtime"
+  export WINEPREFIX=$work/prefix WINEDEBUG=-all WINEDLLOVERRIDES="mscoree,mshtml=" XDG_RUNTIME_DIR=$work/runtime
   display=""
   for n in $(seq 90 140); do
     if [ ! -e "/tmp/.X$n-lock" ] && [ ! -e "/tmp/.X11-unix/X$n" ]; then display=$n; break; fi

@@ -100,18 +100,6 @@ TEST(Ramps, TheStartRampTheFadeInAndTheFadeOutFollowTheirLawsFrameByFrame) {
     ExpectBlock(8790, nullptr, 0, "fade-out of length 0");
 }
 
-TEST(StopCheck, PlayStopsInTheBlockAfterTheStopBlockCountingFromTheFirst) {
-    for (int32_t ahead : {0, 1}) {  // the current minute stops in the second priming block; a minute ahead in block 352
-        ResetProgramState();
-        Set({{AlarmOn, 1}, {Alarm_Hr, 11}, {Alarm_Min, 30 + ahead}, {Alarm_PM, 1}, {Alarm_AM, 0}});
-        Platform.ClockHour = 23, Platform.ClockMinute = 30;
-        SetUpTimers(&ControlSettings, &SynthState);
-        PrepareForPlay(&ControlSettings, &SynthState);
-        int32_t block = 0;
-        for (; block < 400 && Platform.Stops == 0; ++block) ProcessBlock(&ControlSettings, &CachedSettings, &SynthState);
-        EXPECT_TRUE(block - 1 == (ahead ? 352 : 1) && Platform.Chimes == 1) << ahead << " minutes ahead: stopped in block " << block - 1;
-    }
-}
 TEST(Chime, QuarterOctavesFrom220EvenLeftOddRightAsLoudAsTheVolumeAndWithinOneLsbOfASinPerFrame) {
     float p[2 * ChimePartialCount];
     MakeChimePartials(p);

@@ -73,10 +73,10 @@ void TypeTimeOfDay(int32_t minuteOfDay) {
     Type(MinuteFieldId, std::to_string(minuteOfDay % 60));
     Press(hour < 12 ? AmId : PmId);
 }
+// What Play disables and Stop enables, besides the Fade Out pair.
+const int32_t TimerControls[] = {StopTimeId, HourFieldId, MinuteFieldId, AmId, PmId, AlarmId, FadeInFieldId, FadeInId, ChimeTestId};
 bool TimerControlsEnabled(bool on) {
-    for (int32_t id : {StopTimeId, HourFieldId, MinuteFieldId, AmId, PmId, AlarmId, FadeInFieldId, FadeInId, ChimeTestId})
-        if (Enabled(id) != on) return false;
-    return true;
+    return std::all_of(std::begin(TimerControls), std::end(TimerControls), [&](int32_t id) { return Enabled(id) == on; });
 }
 void Restart() { SettingsLoaded = 0, LoadSettings(); }  // what a start does with the stored settings
 // A number as the program stores it: a REG_DWORD holding the start of its text.
@@ -112,8 +112,6 @@ protected:
     }
 };
 
-// ---------------------------------------------------------------- the first start
-
 // Asks the harness to photograph the client area and compare it with the
 // committed picture tests/program/REFERENCE.png (made under the harness's
 // fixed display, Wine and fonts).
@@ -136,20 +134,18 @@ TEST(FirstStart, TheWindowLooksAsItsPicturesClosedWithThePanelAndAfterAResize) {
     EXPECT_TRUE(Photograph("first-start", "first-start"));
     SendMessageA(MainWindow, WM_COMMAND, EqPanelId, 0);  // as the button's click, leaving no focus mark in the pictures
     EXPECT_TRUE(Photograph("panel-open", "panel-open"));
-    // The panel button opens and closes, checking EQ Lock each time; Close only closes.
-    const struct { int32_t Press, Height; } presses[] = {{EqPanelId, 270}, {EqPanelId, 580}, {EqCloseId, 270}, {EqCloseId, 270}};
-    for (const auto& p : presses) {
+    RECT r;
+    std::string heights;  // the panel button opens and closes, checking EQ Lock each time; Close only closes
+    for (int32_t id : {EqPanelId, EqPanelId, EqCloseId, EqCloseId}) {
         SendMessageA(C(EqLockId), BM_SETCHECK, BST_UNCHECKED, 0);
-        SendMessageA(MainWindow, WM_COMMAND, p.Press, 0);
-        RECT r;
+        SendMessageA(MainWindow, WM_COMMAND, id, 0);
         GetWindowRect(MainWindow, &r);
-        EXPECT_TRUE(r.bottom - r.top == p.Height && (p.Press == EqCloseId || Checked(EqLockId)))
-            << "after " << p.Press << ": height " << r.bottom - r.top << ", expected " << p.Height << ", EQ Lock " << Checked(EqLockId);
+        heights += std::to_string(r.bottom - r.top) + (Checked(EqLockId) ? "L " : " ");
     }
+    EXPECT_EQ(heights, "270L 580L 270 270 ") << "the window's height after Panel, Panel, Close, Close (L: EQ Lock checked)";
     for (HWND c : {C(EqBandFirst + 20), C(EqLockId), EqFrame, C(EqLevelId), C(EqFrequencyId), EqLevelLabel, EqFrequencyLabel})
         EXPECT_FALSE(IsWindowVisible(c)) << "a panel control shown with the panel closed";
     SetWindowPos(MainWindow, nullptr, 0, 0, 900, 400, SWP_NOZORDER | SWP_NOMOVE | SWP_NOACTIVATE);
-    RECT r;
     GetWindowRect(MainWindow, &r);
     EXPECT_TRUE(r.right - r.left == 750 && r.bottom - r.top == 270) << r.right - r.left << " x " << r.bottom - r.top;
     EXPECT_TRUE(Photograph("after-resize", "first-start"));
@@ -171,20 +167,17 @@ TEST(FirstStart, TheWindowLooksAsItsPicturesClosedWithThePanelAndAfterAResize) {
     EXPECT_EQ(GetClassLongPtrA(MainWindow, GCLP_HICON), reinterpret_cast<LONG_PTR>(LoadIconA(GetModuleHandleA(nullptr), MAKEINTRESOURCEA(101))));
 }
 
-// ---------------------------------------------------------------- commands and switches
-
 TEST_F(App, PlayDisablesTheTimerControlsAloneAndStopEnablesThemAgain) {
-    const int32_t refused[] = {StopTimeId, HourFieldId, MinuteFieldId, AmId, PmId, AlarmId,
-                               FadeInFieldId, FadeInId, FadeOutFieldId, FadeOutId, ChimeTestId};
     std::vector<std::pair<HWND, bool>> before;
     for (HWND c = GetWindow(MainWindow, GW_CHILD); c != nullptr; c = GetWindow(c, GW_HWNDNEXT)) before.push_back({c, IsWindowEnabled(c) != FALSE});
     Press(StopId);  // while stopped: nothing
     EXPECT_TRUE(TimerControlsEnabled(true));
     Press(PlayId);
     ASSERT_EQ(IsPlaying, 1);
-    for (const auto& c : before) {
-        const bool listed = std::any_of(std::begin(refused), std::end(refused), [&](int32_t id) { return C(id) == c.first; });
-        EXPECT_EQ(IsWindowEnabled(c.first) != FALSE, c.second && !listed) << "control " << GetDlgCtrlID(c.first) << " while playing";
+    for (const auto& [control, was] : before) {
+        const int32_t id = GetDlgCtrlID(control);
+        const bool refused = std::count(std::begin(TimerControls), std::end(TimerControls), id) || id == FadeOutId || id == FadeOutFieldId;
+        EXPECT_EQ(IsWindowEnabled(control) != FALSE, was && !refused) << "control " << id << " while playing";
     }
     const int32_t blocks = SynthState.BlockIndex;
     Press(PlayId);  // while playing: nothing, no new stream
@@ -205,13 +198,13 @@ TEST_F(App, SwitchesSetTheirFieldsAndTheFadeOutPairFollowsStopTimeAndAlarm) {
     const int32_t profiles[][2] = {{1043, 100}, {1044, 101}, {1045, 102}, {1046, 103}, {1047, 104}, {1048, 105}, {DogsId, 107}, {TrafficId, 106}};
     for (const auto& p : profiles) {
         Press(p[0]);
-        EXPECT_EQ(ControlSettings.Value[Profile], p[1]) << "after button " << p[0];
         for (const auto& other : profiles) EXPECT_EQ(Checked(other[0]), other[0] == p[0]) << "after button " << p[0];
+        EXPECT_EQ(ControlSettings.Value[Profile], p[1]) << "after button " << p[0];
     }
     for (int32_t id : {PmId, AmId}) {
         Press(id);
-        EXPECT_TRUE(ControlSettings.Value[Alarm_PM] == (id == PmId) && ControlSettings.Value[Alarm_AM] == (id == AmId)) << "after " << id;
-        EXPECT_TRUE(Checked(id) && !Checked(id == AmId ? PmId : AmId)) << "after " << id;
+        EXPECT_TRUE(ControlSettings.Value[Alarm_PM] == (id == PmId) && ControlSettings.Value[Alarm_AM] == (id == AmId) && Checked(id) &&
+                    !Checked(id == AmId ? PmId : AmId)) << "after " << id;
     }
     for (int32_t id : {StopTimeId, FadeOutId, FadeInId}) Press(id);
     EXPECT_TRUE(ControlSettings.Value[FadeOutOn] == 1 && ControlSettings.Value[FadeInOn] == 1);
@@ -253,18 +246,8 @@ TEST_F(App, SlidersStepWithinTheirRangeAndABandStepSetsEqChangedAndTheMemory) {
             }
             Scroll(id, SB_THUMBPOSITION, 128);
         }
-        for (int32_t position = 1; position <= 255; position += 2) {  // a drag writes every position
-            Scroll(Attenuator, SB_THUMBTRACK, position);
-            ASSERT_EQ(ControlSettings.Value[Attenuator], position);
-        }
     }
-    Scroll(EqBandFirst + 10, SB_THUMBPOSITION, 1);  // the next block builds the equaliser from the bands
-    ProcessBlock(&ControlSettings, &CachedSettings, &SynthState);
-    EXPECT_NEAR(SynthState.EqResponse[68], 10.0f, 1e-4) << "band 10 (bin 68) at +20 dB";
-    EXPECT_EQ(EqChanged, 0);
 }
-
-// ---------------------------------------------------------------- the meter
 
 // Where the blue and the red bar of a row end (one past their last pixel,
 // 16 when there is none).
@@ -285,10 +268,7 @@ TEST_F(App, MeterBarsAreBlueUpTo28000RedAboveUpperRightAndEmptyWhenStopped) {
     Press(PlayId);
     ASSERT_TRUE(PumpUntil([] { return BarEnds(5).first > 16; }, 5000)) << "no bar while playing";
     static float right[BlockFrames], left[BlockFrames];  // between two blocks the peaks given here are painted
-    for (int32_t i = 0; i < BlockFrames; ++i) {
-        right[i] = i == 100 ? -28000.0f : 5.0f;
-        left[i] = i == 4000 ? 28001.5f : -7.0f;
-    }
+    for (int32_t i = 0; i < BlockFrames; ++i) right[i] = i == 100 ? -28000.0f : 5.0f, left[i] = i == 4000 ? 28001.5f : -7.0f;
     UpdatePeaks(right, left);
     const std::pair<int32_t, int32_t> blue673{673, 16}, red674{16, 674}, none{16, 16};
     for (int32_t y = 2; y <= 19; ++y)
@@ -303,11 +283,7 @@ TEST_F(App, MeterBarsAreBlueUpTo28000RedAboveUpperRightAndEmptyWhenStopped) {
     }
     Press(StopId);
     EXPECT_TRUE(BarEnds(5) == none && BarEnds(15) == none) << "after Stop";
-    RedrawWindow(MainWindow, nullptr, nullptr, RDW_INVALIDATE | RDW_ERASE);
-    EXPECT_EQ(BarEnds(5), none) << "a repaint while stopped";
 }
-
-// ---------------------------------------------------------------- the ring
 
 // After every refill two blocks are queued: the slot written next is two
 // ahead of the one the device hands back next.
@@ -317,9 +293,8 @@ TEST_F(App, RingSlotsGoInOrderAndEveryPlayStartsAgainAtSlot0) {
     for (int32_t round = 0; round < 3; ++round) {
         Press(PlayId);  // round 1 and 2: right after Stop, with its handed-back buffers still to come
         ASSERT_TRUE(WriteSlot == 2 && DoneSlot == 0 && SynthState.BlockIndex == 2) << "round " << round;
-        const WAVEFORMATEX& f = StreamFormat;  // 48 000 Hz, 16-bit stereo PCM, its derived fields computed
-        EXPECT_TRUE(f.wFormatTag == 1 && f.nChannels == 2 && f.nSamplesPerSec == 48000 && f.wBitsPerSample == 16 &&
-                    f.nBlockAlign == 4 && f.nAvgBytesPerSec == 192000 && f.cbSize == 0);
+        const WAVEFORMATEX& f = StreamFormat;  // 48 000 Hz 16-bit stereo PCM; Windows' drivers read the derived fields, Wine's do not
+        EXPECT_TRUE(f.wFormatTag == 1 && f.nChannels == 2 && f.nSamplesPerSec == 48000 && f.wBitsPerSample == 16 && f.nBlockAlign == 4 && f.nAvgBytesPerSec == 192000 && !f.cbSize);
         for (int32_t refill = 1; refill <= 4; ++refill) {
             ASSERT_TRUE(PumpUntil([&] { return DoneSlot == refill % 3; }, 3000)) << "round " << round << " refill " << refill;
             EXPECT_TRUE(RingInOrder() && SynthState.BlockIndex == 2 + refill && BuffersQueued == 2)
@@ -333,37 +308,33 @@ TEST_F(App, RingSlotsGoInOrderAndEveryPlayStartsAgainAtSlot0) {
     EXPECT_TRUE(WriteSlot == 0 && DoneSlot == 0 && HandedBack == 0);
 }
 
-// The code box of a failed release is held open until a notification has
-// arrived behind it; then the device is put back.
+// A release failing mid-stream: its box is held open until a notification
+// waits behind it, then the device is put back; the ring stays in order.
 HWAVEOUT RealDevice = nullptr;
-bool HoldUntilANotificationWaits(const Box& box) {
-    if (box.Text != "Error 4531" || RealDevice == nullptr) return false;
-    static ULONGLONG since = GetTickCount64();
-    if (DeferredRefills == 0 && GetTickCount64() - since < 5000) return true;
-    EXPECT_GE(DeferredRefills, 1) << "no notification arrived while the box was open";
-    MainDevice = RealDevice;
-    RealDevice = nullptr;
-    return false;
-}
-
+int32_t MostDeferred = 0;  // notifications seen held back while the box was open
 TEST_F(App, ANotificationDuringAStreamErrorBoxWaitsAndTheRingStaysInOrder) {
     Press(PlayId);
     ASSERT_TRUE(PumpUntil([] { return DoneSlot == 1; }, 3000));
-    RealDevice = MainDevice;  // the next release fails on a handle that is not a device
-    MainDevice = reinterpret_cast<HWAVEOUT>(static_cast<UINT_PTR>(0x5A5A));
-    HoldBox = HoldUntilANotificationWaits;
+    RealDevice = MainDevice;
+    MainDevice = reinterpret_cast<HWAVEOUT>(static_cast<UINT_PTR>(0x5A5A));  // not a device: the next release fails
+    HoldBox = [](const Box& box) {
+        static const ULONGLONG since = GetTickCount64();
+        if (box.Text != "Error 4531" || MainDevice == RealDevice) return false;
+        MostDeferred = std::max(MostDeferred, DeferredRefills);
+        if (DeferredRefills == 0 && GetTickCount64() - since < 5000) return true;
+        return MainDevice = RealDevice, false;
+    };
     const int32_t blocks = SynthState.BlockIndex;
     ASSERT_TRUE(PumpUntil([&] { return SynthState.BlockIndex >= blocks + 6; }, 10000)) << "the stream did not go on";
     HoldBox = nullptr;
     char text[400];
     waveOutGetErrorTextA(MMSYSERR_INVALHANDLE, text, sizeof(text));
     EXPECT_EQ(BoxTexts(), (Texts{"Error 4531", text}));
-    EXPECT_EQ(DeferredRefills, 0) << "held-back notifications never handled";
+    EXPECT_TRUE(MostDeferred >= 1 && DeferredRefills == 0) << "held back while the box was open " << MostDeferred << ", never handled " << DeferredRefills;
     for (int32_t n = 1; n <= 3; ++n) {
         const int32_t next = (DoneSlot + 1) % 3;
         ASSERT_TRUE(PumpUntil([&] { return DoneSlot == next; }, 3000)) << "refill " << n << " after the box";
-        EXPECT_TRUE(RingInOrder()) << "WriteSlot " << WriteSlot << ", DoneSlot " << DoneSlot;
-        EXPECT_EQ(WaveHeaders[WriteSlot].dwFlags & WHDR_INQUEUE, 0u) << "slot " << WriteSlot << " written next is still queued";
+        EXPECT_TRUE(RingInOrder() && (WaveHeaders[WriteSlot].dwFlags & WHDR_INQUEUE) == 0) << "WriteSlot " << WriteSlot << ", DoneSlot " << DoneSlot;
     }
 }
 
@@ -377,15 +348,8 @@ void CountNotifications(bool on) {
     if (on) Tally = DoneTally{0, 0, reinterpret_cast<WNDPROC>(SetWindowLongPtrA(MainWindow, GWLP_WNDPROC, reinterpret_cast<LONG_PTR>(CountingProc)))};
     else SetWindowLongPtrA(MainWindow, GWLP_WNDPROC, reinterpret_cast<LONG_PTR>(Tally.Next));
 }
-// Waits out the chime and the notifications of buffers a chime closed early hands back after its end.
-bool ChimeEnds() {
-    const bool ended = PumpUntil([] { return IsChiming == 0; }, 20000);
-    PumpUntil([] { return Tally.After > 0; }, 1000);
-    CountNotifications(false);
-    return ended;
-}
 
-TEST_F(App, TheAlarmStopsTheRainChimesOnceRefusesPlayAndTheTestMeanwhileAndTheTestRightAfterStopCountsItsOwnBuffers) {
+TEST_F(App, TheAlarmStopsTheRainChimesOnceAndRefusesPlayAndTheTestMeanwhile) {
     SetBox(AlarmId, true);
     TypeTimeOfDay(ClockMinute());  // now: the second priming block stops the rain
     Scroll(Attenuator, SB_THUMBPOSITION, 255);
@@ -400,23 +364,13 @@ TEST_F(App, TheAlarmStopsTheRainChimesOnceRefusesPlayAndTheTestMeanwhileAndTheTe
     Press(ChimeTestId);
     Press(PlayId);
     EXPECT_TRUE(IsChiming == 1 && IsPlaying == 0 && ChimeBuffersDone >= done && ChimeDevice == chime) << "the test or Play acted while the chime played";
-    EXPECT_TRUE(ChimeEnds()) << "the chime did not end";
+    EXPECT_TRUE(PumpUntil([] { return IsChiming == 0; }, 20000)) << "the chime did not end";
+    PumpUntil([] { return Tally.After > 0; }, 1000);  // the buffers of a chime closed early would come back now
+    CountNotifications(false);
     EXPECT_EQ(Tally.WhileChiming, 1 + 32) << "block 0 handed back by the stop, and the chime's 32 buffers";
     EXPECT_EQ(Tally.After, 0) << "a second chime, or one closed before its end";
-    EXPECT_EQ(ChimeBuffersDone, 32);
-    SetBox(AlarmId, false);  // Play again; the test right after Stop, whose handed-back buffers are
-    Press(PlayId);           // still queued and whose device's handle value the chime's may get
-    ASSERT_TRUE(IsPlaying == 1 && PumpUntil([] { return DoneSlot == 1; }, 3000)) << "Play after the chime";
-    Press(StopId);
-    CountNotifications(true);
-    Press(ChimeTestId);
-    ASSERT_EQ(IsChiming, 1);
-    EXPECT_TRUE(ChimeEnds()) << "the test's chime did not end";
-    EXPECT_EQ(Tally.WhileChiming, 2 + 32) << "the stop's 2 handed-back buffers and the chime's 32";
-    EXPECT_TRUE(Tally.After == 0 && ChimeBuffersDone == 32 && HandedBack == 0) << "after " << Tally.After << ", done " << ChimeBuffersDone;
+    EXPECT_TRUE(ChimeBuffersDone == 32 && HandedBack == 0) << "done " << ChimeBuffersDone << ", still handed back " << HandedBack;
 }
-
-// ---------------------------------------------------------------- the equaliser panel
 
 // Levels, thumbs and memories, to see what an action changed.
 std::string Levels() {
@@ -456,11 +410,6 @@ TEST_F(App, LockAndDefeatIgnoreScrollingDefeatKeepsThePresetsAndAMemoryFollowsIt
     Press(M3Id);  // the selected memory again: no level changes, a rebuild and band 0 shown
     EXPECT_TRUE(Levels() == levels && EqChanged == 1);
     EXPECT_EQ(Text({EqLevelId, EqFrequencyId}), "0 20") << "band 0 at 122 (+0.94 dB)";
-    SendMessageA(C(EqLevelId), WM_CHAR, '7', 0);  // typing into a readout changes nothing
-    SetWindowTextA(C(EqFrequencyId), "999");
-    EXPECT_EQ(Levels(), levels);
-    Scroll(EqBandFirst + 4, SB_LINEDOWN);
-    EXPECT_EQ(Text({EqFrequencyId}), "50") << "the next update replaces the typed text";
 }
 
 TEST_F(App, ReadoutsShowTheCentreAndTheLevelCutTowardZero) {
@@ -470,18 +419,8 @@ TEST_F(App, ReadoutsShowTheCentreAndTheLevelCutTowardZero) {
     for (const auto& c : cases) {
         Scroll(EqBandFirst + c.Band, SB_THUMBPOSITION, c.Value);
         EXPECT_EQ(Text({EqLevelId, EqFrequencyId}), c.Shown) << "band " << c.Band << " at " << c.Value;
-        EXPECT_EQ(SynthState.EqBandLevelDb[c.Band], EqLevelDbFor(c.Value));
     }
-    SetWindowTextA(C(EqLevelId), "5");  // a vertical scroll naming a slider that is no band
-    SendMessageA(MainWindow, WM_VSCROLL, MAKEWPARAM(SB_PAGEDOWN, 0), reinterpret_cast<LPARAM>(C(Attenuator)));
-    ASSERT_EQ(Boxes.size(), 1u);
-    EXPECT_TRUE(Boxes[0].Text == "Error 7294" && Boxes[0].Caption == "Sombrel Player" && Boxes[0].Icon == nullptr && Boxes[0].Buttons == 1);
-    Boxes.clear();
-    EXPECT_EQ(Text({EqLevelId, EqFrequencyId}), " ") << "readouts after Error 7294";
-    EXPECT_EQ(ControlSettings.Value[Attenuator], 128) << "the volume moved by a vertical scroll";
 }
-
-// ---------------------------------------------------------------- the time fields
 
 const char *const MinuteBox = "Minutes must be between 0 and 59", *const HourBox = "Hours must be between 1 and 12",
                   *const FadeInBox = "Fade In Time must be between 1 and 15 minutes",
@@ -500,15 +439,10 @@ bool NoteRedFields(const Box&) {
 TEST_F(App, PlayChecksTheFieldsOfTheFeaturesThatAreOnRewritesThemAndSaysWhatIsWrong) {
     // Switches: "s" Stop Time, "a" Alarm, "i" Fade In, "o" Fade Out. The stop
     // time, when valid, is always at least six hours away.
-    const struct {
-        const char* On;
-        const char* Typed[4];  // minute, hour, fade-in, fade-out
-        Texts Complaints;
-        const char* Red;       // fields red while each box is open
-        const char* Shown[4];  // the fields' texts after Play
-        int32_t Stored[4];     // Alarm_Min, Alarm_Hr, FadeInTime, FadeOutTime (-1: not looked at)
-        int32_t Focus;
-    } rows[] = {
+    // Typed and Shown (after Play): minute, hour, fade-in, fade-out; Red: the
+    // fields red while each box is open; Stored: Alarm_Min, Alarm_Hr,
+    // FadeInTime, FadeOutTime (-1: not looked at); Focus: where it ends.
+    const struct { const char *On, *Typed[4]; Texts Complaints; const char *Red, *Shown[4]; int32_t Stored[4], Focus; } rows[] = {
         {"s", {"7x", ".", "", ""}, {MinuteBox, HourBox}, "mh.. mh..", {"7x", "0", "", ""}, {-1, 0, -1, -1}, HourFieldId},
         {"si", {"30", "13", "-5", ""}, {HourBox, FadeInBox}, ".h.. .hi.", {"30", "13", "-5", ""}, {30, 13, -1, -1}, FadeInFieldId},
         {"", {"7x", "", "99", "1.5"}, {}, "", {"7x", "", "99", "1.5"}, {-1, -1, -1, -1}, 0},
@@ -536,8 +470,7 @@ TEST_F(App, PlayChecksTheFieldsOfTheFeaturesThatAreOnRewritesThemAndSaysWhatIsWr
             EXPECT_TRUE(box.Caption == "Sombrel Player" && box.Icon == LoadIconA(nullptr, IDI_HAND) && box.Buttons == 1) << box.Text;
         EXPECT_EQ(BoxTexts(), r.Complaints);
         EXPECT_EQ(RedWhileOpen, r.Red);
-        EXPECT_EQ(Text({MinuteFieldId, HourFieldId, FadeInFieldId, FadeOutFieldId}),
-                  std::string(r.Shown[0]) + " " + r.Shown[1] + " " + r.Shown[2] + " " + r.Shown[3]);
+        EXPECT_EQ(Text({MinuteFieldId, HourFieldId, FadeInFieldId, FadeOutFieldId}), std::string(r.Shown[0]) + " " + r.Shown[1] + " " + r.Shown[2] + " " + r.Shown[3]);
         for (int32_t i = 0; i < 4; ++i) {
             EXPECT_TRUE(r.Stored[i] < 0 || ControlSettings.Value[StoredField[i]] == r.Stored[i])
                 << "field " << TimeFields[i] << " stored " << ControlSettings.Value[StoredField[i]];
@@ -558,11 +491,7 @@ TEST_F(App, PlayChecksTheFieldsOfTheFeaturesThatAreOnRewritesThemAndSaysWhatIsWr
         EXPECT_EQ(BrushOf(field), WhiteFieldBrush) << "field " << field << " after its text was set";
         SetBox(switches[c], false);
     }
-    const HBRUSH other = BrushOf(EqLevelId);
-    EXPECT_TRUE(other != RedFieldBrush && other != WhiteFieldBrush) << "a readout got a time field's brush";
 }
-
-// ---------------------------------------------------------------- the stored settings
 
 // A full set of stored values, each distinct where the control allows it.
 int32_t Distinct(int32_t row) {
@@ -586,10 +515,7 @@ TEST_F(App, StoredSettingsComeBackOnceIntoTheControlsAndAreStoredBackByteForByte
     Scroll(Attenuator, SB_THUMBPOSITION, Distinct(0));
     Press(EqDefeatId);  // the bands flat: a save writes the memories, not the bands
     ASSERT_TRUE(ForgetStoredSettings());
-    HasPlayed = 0;
-    SaveSettings();
-    EXPECT_FALSE(KeyExists()) << "a run without Play wrote the settings";
-    HasPlayed = 1;
+    HasPlayed = 1;  // a run without Play stores nothing: the Launch test
     SaveSettings();
     EXPECT_EQ(ValueCount(), StoredValueCount);
     for (int32_t row = 0; row < StoredValueCount; ++row)
@@ -614,14 +540,9 @@ TEST_F(App, StoredSettingsComeBackOnceIntoTheControlsAndAreStoredBackByteForByte
 }
 
 TEST_F(App, AUserWhoMayNotWriteTheMachineKeyKeepsTheSettingsInTheirOwnKey) {
-    const struct { int32_t Machine, User, Shown; } starts[] = {{0, 0, 128}, {50, 0, 50}, {0, 60, 60}, {50, 60, 60}};
-    for (const auto& s : starts) {  // the per-user key, when there is one, is read
-        ASSERT_TRUE(ForgetStoredSettings());
-        ASSERT_TRUE((!s.Machine || StoreNumber("Attenuator", s.Machine, HKEY_LOCAL_MACHINE)) && (!s.User || StoreNumber("Attenuator", s.User, HKEY_CURRENT_USER)));
-        Scroll(Attenuator, SB_THUMBPOSITION, 128);
-        Restart();
-        EXPECT_EQ(Thumb(Attenuator), s.Shown) << "machine's key " << s.Machine << ", user's " << s.User << " (0: none)";
-    }
+    ASSERT_TRUE(ForgetStoredSettings() && StoreNumber("Attenuator", 50, HKEY_LOCAL_MACHINE) && StoreNumber("Attenuator", 60, HKEY_CURRENT_USER));
+    Restart();
+    EXPECT_EQ(Thumb(Attenuator), 60) << "the user's key is read when there is one";
     HasPlayed = 1;
     SaveSettings();  // to the machine's key; the user's older copy goes
     EXPECT_TRUE(RawValue("Attenuator") == StoredForm(60) && !KeyExists(HKEY_CURRENT_USER));
@@ -638,16 +559,13 @@ TEST_F(App, AUserWhoMayNotWriteTheMachineKeyKeepsTheSettingsInTheirOwnKey) {
     ASSERT_TRUE(ForgetStoredSettings());
 }
 
-// ---------------------------------------------------------------- the sound device missing
-
 // Every failing device call shows its code (no icon) and then the device's
 // own text (exclamation mark), each with an OK button alone; `codes` are the
 // code boxes' texts and captions, leaving out a release's 4532.
 void ExpectFailures(const std::vector<std::pair<std::string, std::string>>& codes) {
-    Texts texts;
+    Texts texts;  // every text the device has for a result
     char text[400];
-    for (UINT code = 1; code < 64; ++code)
-        if (waveOutGetErrorTextA(code, text, sizeof(text)) == MMSYSERR_NOERROR) texts.push_back(text);
+    for (UINT code = 1; code < 64; ++code) if (waveOutGetErrorTextA(code, text, sizeof(text)) == MMSYSERR_NOERROR) texts.push_back(text);
     std::vector<std::pair<std::string, std::string>> seen;
     for (size_t i = 0; i + 1 < Boxes.size(); i += 2) {
         const Box& device = Boxes[i + 1];
@@ -678,28 +596,13 @@ TEST_F(App, NoDeviceMakesPlayStopAndTheChimeTestShowEveryFailureAndTheProgramCom
     }
 }
 
-TEST_F(App, DeviceBackPlayWorksAgainWhenTheSoundServerReturns) {
-    ASSERT_TRUE(AskHarness("stop-sound-server"));
-    Press(PlayId);
-    EXPECT_TRUE(!Boxes.empty() && Boxes[0].Text == "Error 4528");
-    Press(StopId);
-    Boxes.clear();
-    ASSERT_TRUE(AskHarness("start-sound-server"));
-    Press(PlayId);
-    EXPECT_EQ(IsPlaying, 1);
-    EXPECT_TRUE(PumpUntil([] { return DoneSlot == 2; }, 5000)) << "no refill with the device back";
-    EXPECT_GT(MeterState.PeakRight, 0);
-}
-
-// ---------------------------------------------------------------- the sound
-
 // Run while the harness records the sound server into SOMBREL_CAPTURE. The
 // time line tells compare_recording.py what was played, each line ending
 // with the recording's size at that moment:
 //   play OPTIONS       Play pressed; the render tool's OPTIONS are in force
 //   set BLOCK OPTIONS  from block BLOCK on the settings are OPTIONS
 //   stop BLOCK         Stop pressed after BLOCK blocks were made
-//   chime OPTIONS      the alarm chime started
+//   chime OPTIONS      the chime started
 //   end
 int64_t Recorded() {
     WIN32_FILE_ATTRIBUTE_DATA data;
@@ -708,12 +611,14 @@ int64_t Recorded() {
     return static_cast<int64_t>(data.nFileSizeHigh) << 32 | data.nFileSizeLow;
 }
 void Note(const std::string& line) { std::ofstream((WorkDir() + "\\timeline.txt").c_str(), std::ios::app) << line << ' ' << Recorded() << '\n'; }
+// From the next block on, the render tool's options are `options`.
+void NoteChange(const std::string& options) { Note("set " + std::to_string(SynthState.BlockIndex) + " " + options); }
 bool RecordFor(double seconds) {
     const int64_t target = Recorded() + static_cast<int64_t>(seconds * 48000) * 4;
     return Recorded() >= 0 && PumpUntil([&] { return Recorded() >= target; }, static_cast<DWORD>(seconds * 3000 + 5000));
 }
 
-TEST_F(App, SoundOfStoredSettingsAndOfChangesWhilePlayingIsWhatTheRenderMakes) {
+TEST_F(App, SoundOfStoredSettingsOfChangesWhilePlayingAndOfTheChimeIsWhatTheRenderMakes) {
     ASSERT_TRUE(RecordFor(0.5)) << "the harness is not recording";
     ASSERT_TRUE(ForgetStoredSettings());
     std::string bands;
@@ -729,47 +634,28 @@ TEST_F(App, SoundOfStoredSettingsAndOfChangesWhilePlayingIsWhatTheRenderMakes) {
     Note("play " + options);
     Press(PlayId);
     ASSERT_TRUE(RecordFor(3));
-    Press(PlayId);  // a second Play must not start the sound again
-    ASSERT_TRUE(RecordFor(1));
     Scroll(Attenuator, SB_THUMBPOSITION, 200);
-    Note("set " + std::to_string(SynthState.BlockIndex) + " " + (options += " --volume 200"));
+    NoteChange(options += " --volume 200");
     ASSERT_TRUE(RecordFor(2));
     Press(DogsId);
-    Note("set " + std::to_string(SynthState.BlockIndex) + " " + (options += " --profile 107"));
+    NoteChange(options += " --profile 107");
     ASSERT_TRUE(RecordFor(2));
     Scroll(EqBandFirst + 14, SB_THUMBPOSITION, 30);
-    Scroll(EqBandFirst + 4, SB_PAGEDOWN);
-    Scroll(EqBandFirst + 4, SB_PAGEDOWN);
+    for (int32_t twice = 0; twice < 2; ++twice) Scroll(EqBandFirst + 4, SB_PAGEDOWN);
     options += " --eq ";
     for (int32_t k = 0; k < EqBandCount; ++k) options += (k ? "," : "") + std::to_string(Band(k));
-    Note("set " + std::to_string(SynthState.BlockIndex) + " " + options);
+    NoteChange(options);
     ASSERT_TRUE(RecordFor(2));
     Press(StopId);
     Note("stop " + std::to_string(SynthState.BlockIndex));
     ASSERT_TRUE(RecordFor(1));
+    Note("chime --volume 200");  // the chime right after Stop, heard whole
+    Press(ChimeTestId);
+    ASSERT_TRUE(IsChiming == 1 && PumpUntil([] { return IsChiming == 0; }, 20000));
+    ASSERT_TRUE(RecordFor(1));
     Note("end");
     ASSERT_TRUE(ForgetStoredSettings());
 }
-
-TEST_F(App, SoundOfTheAlarmAMinuteAheadFadesOutStopsAndChimesOnce) {
-    Scroll(Attenuator, SB_THUMBPOSITION, 200);
-    SetBox(AlarmId, true);
-    SetBox(FadeOutId, true);
-    Type(FadeOutFieldId, "1");
-    TypeTimeOfDay(ClockMinute() + 1);
-    Note("play --volume 200 --stop-after 1 --fade-out 1");
-    Press(PlayId);
-    ASSERT_EQ(IsPlaying, 1);
-    ASSERT_TRUE(PumpUntil([] { return IsChiming == 1; }, 100000)) << "the alarm did not come a minute after Play";
-    Note("chime --volume 200");
-    Press(ChimeTestId);  // both refused while it sounds: the recording would hold them
-    Press(PlayId);
-    ASSERT_TRUE(PumpUntil([] { return IsChiming == 0; }, 20000));
-    ASSERT_TRUE(RecordFor(1));
-    Note("end");
-}
-
-// ---------------------------------------------------------------- Sombrel.exe from outside
 
 // Run with SOMBREL_EXE naming the program, started from its own folder, and
 // without the hosted window.
@@ -778,47 +664,38 @@ std::string Marker() { return WorkDir() + "\\opened.txt"; }
 bool Opened() { return GetFileAttributesA(Marker().c_str()) != INVALID_FILE_ATTRIBUTES; }
 HWND Volume(const Program& p) { return FindWindowExA(p.Window, nullptr, "ScrollBar", nullptr); }
 
-TEST(Launch, HelpOpensTheManualBesideTheProgramOrSaysNothingAndARunWithPlayStoresTheSettingsForTheNextStartWithoutTheMachineKey) {
+TEST(Launch, HelpShowsTheAboutBoxThenOpensTheManualBesideTheProgramAndARunWithPlayStoresTheSettingsForTheNextStartWithoutTheMachineKey) {
     char self[MAX_PATH];
     GetModuleFileNameA(nullptr, self, sizeof(self));
     const std::string command = std::string("\"") + self + "\" --mark-opened \"" + Marker() + "\" \"%1\"";
     RegSetValueA(HKEY_CLASSES_ROOT, ".pdf", REG_SZ, "SombrelTestPdf", 14);
     RegSetValueA(HKEY_CLASSES_ROOT, "SombrelTestPdf\\shell\\open\\command", REG_SZ, command.c_str(), static_cast<DWORD>(command.size()));
-    const std::string alone = WorkDir() + "\\no-manual";  // a copy of the program with no manual beside it
-    CreateDirectoryA(alone.c_str(), nullptr);
-    ASSERT_TRUE(CopyFileA(Exe.c_str(), (alone + "\\Sombrel.exe").c_str(), FALSE) && ForgetStoredSettings());
+    ASSERT_TRUE(ForgetStoredSettings());
     Program p;
     ASSERT_TRUE(Launch(&p, Exe)) << Exe;
     EXPECT_EQ(Close(&p), 0);
     EXPECT_FALSE(KeyExists()) << "a run without Play stored the settings";
     ASSERT_TRUE(DenyKey(HKEY_LOCAL_MACHINE));  // as for a standard user on Windows
-    for (const std::string& exe : {Exe, alone + "\\Sombrel.exe"}) {
+    for (int32_t start = 1; start <= 2; ++start) {
         DeleteFileA(Marker().c_str());
-        ASSERT_TRUE(Launch(&p, exe)) << exe;
-        EXPECT_EQ(SendMessageA(Volume(p), SBM_GETPOS, 0, 0), exe == Exe ? 128 : 200) << "the volume at the start";
-        PostMessageA(GetDlgItem(p.Window, 1051), BM_CLICK, 0, 0);
+        ASSERT_TRUE(Launch(&p, Exe)) << Exe;
+        EXPECT_EQ(SendMessageA(Volume(p), SBM_GETPOS, 0, 0), start == 1 ? 128 : 200) << "the volume at start " << start;
+        PostMessageA(GetDlgItem(p.Window, HelpId), BM_CLICK, 0, 0);
         ASSERT_TRUE(PumpUntil([&] { return !OpenBoxes(p).empty() && ReadBox(OpenBoxes(p)[0]).Buttons > 0; }, 20000)) << "no about box";
         const Box about = ReadBox(OpenBoxes(p)[0]);
         EXPECT_TRUE(about.Caption == "Sombrel Player" && about.Text.find("Sombrel Player") != std::string::npos &&
                     about.Text.find("1.00") != std::string::npos && about.Icon == nullptr && about.Buttons == 1) << about.Text;
         EXPECT_FALSE(PumpUntil(Opened, 1500)) << "the manual was opened while the about box was open";
         PostMessageA(OpenBoxes(p)[0], WM_COMMAND, MAKEWPARAM(IDOK, BN_CLICKED), 0);
-        if (exe == Exe) {
-            ASSERT_TRUE(PumpUntil(Opened, 20000)) << "the manual was not opened";
-            std::string opened;
-            std::getline(std::ifstream(Marker().c_str()), opened);
-            EXPECT_EQ(lstrcmpiA(opened.c_str(), (Exe.substr(0, Exe.find_last_of('\\')) + "\\Sombrel.pdf").c_str()), 0) << opened;
-            DWORD_PTR result = 0;
-            SendMessageTimeoutA(p.Window, WM_HSCROLL, MAKEWPARAM(SB_THUMBPOSITION, 200), reinterpret_cast<LPARAM>(Volume(p)), SMTO_NORMAL, 10000, &result);
-        } else {  // what the shell says is its own: no box of the program's
-            PumpUntil([] { return false; }, 2000);
-            for (HWND box : OpenBoxes(p)) EXPECT_NE(ReadBox(box).Caption.substr(0, 7), "Sombrel") << ReadBox(box).Text;
-            EXPECT_FALSE(Opened());
-        }
-        EXPECT_TRUE(Click(p, 1030) && (exe == Exe || Click(p, 1031))) << "Play, and Stop after the second start";
-        EXPECT_EQ(Close(&p), 0) << (exe == Exe ? "closed while playing" : "closed after Stop");
-        EXPECT_TRUE(exe != Exe || Boxes.empty()) << "boxes at the close: " << (Boxes.empty() ? "" : Boxes[0].Text);
-        Boxes.clear();  // the shell's, if any
+        ASSERT_TRUE(PumpUntil(Opened, 20000)) << "the manual was not opened";
+        std::string opened;
+        std::getline(std::ifstream(Marker().c_str()), opened);
+        EXPECT_EQ(lstrcmpiA(opened.c_str(), (Exe.substr(0, Exe.find_last_of('\\')) + "\\Sombrel.pdf").c_str()), 0) << opened;
+        DWORD_PTR result = 0;
+        if (start == 1) SendMessageTimeoutA(p.Window, WM_HSCROLL, MAKEWPARAM(SB_THUMBPOSITION, 200), reinterpret_cast<LPARAM>(Volume(p)), SMTO_NORMAL, 10000, &result);
+        EXPECT_TRUE(Click(p, PlayId) && (start == 1 || Click(p, StopId))) << "Play, and Stop at the second start";
+        EXPECT_EQ(Close(&p), 0) << (start == 1 ? "closed while playing" : "closed after Stop");
+        EXPECT_EQ(BoxTexts(), Texts{}) << "boxes at the close";
         EXPECT_EQ(RawValue("Attenuator", HKEY_CURRENT_USER), StoredForm(200)) << "the settings stored in the user's key at the end of a run with Play";
     }
     RegDeleteTreeA(HKEY_CLASSES_ROOT, "SombrelTestPdf");

@@ -15,7 +15,7 @@ BOOL CALLBACK ReadBoxChild(HWND child, LPARAM data) {
     GetClassNameA(child, cls, sizeof(cls));
     Box* box = reinterpret_cast<Box*>(data);
     if (!IsWindowVisible(child)) return TRUE;
-    if (lstrcmpiA(cls, "Button") == 0) ++box->Buttons;
+    box->Buttons += lstrcmpiA(cls, "Button") == 0;
     if (lstrcmpiA(cls, "Static") == 0 && (GetWindowLongA(child, GWL_STYLE) & SS_TYPEMASK) == SS_ICON)
         box->Icon = reinterpret_cast<HICON>(SendMessageA(child, STM_GETICON, 0, 0));
     return TRUE;
@@ -72,8 +72,7 @@ void StartAnsweringBoxes() { SetTimer(nullptr, 0, 20, AnswerBox); }
 std::vector<std::string> BoxTexts() {
     std::vector<std::string> texts;
     for (const Box& box : Boxes) texts.push_back(box.Text);
-    Boxes.clear();
-    return texts;
+    return Boxes.clear(), texts;
 }
 
 std::string WindowsPath(const std::string& path) {
@@ -83,17 +82,13 @@ std::string WindowsPath(const std::string& path) {
     return out;
 }
 
-std::string WorkDir() {
-    const char* work = std::getenv("SOMBREL_WORK");
-    return WindowsPath(work ? work : "/tmp");
-}
+std::string WorkDir() { return WindowsPath(std::getenv("SOMBREL_WORK") ? std::getenv("SOMBREL_WORK") : "/tmp"); }
 
 bool AskHarness(const char* request, const std::string& detail) {
     const std::string path = WorkDir() + "\\requests\\" + request;
     std::ofstream(path + ".part") << detail;
     if (!MoveFileExA((path + ".part").c_str(), path.c_str(), MOVEFILE_REPLACE_EXISTING)) return false;
-    return PumpUntil([&] { return GetFileAttributesA((path + ".done").c_str()) != INVALID_FILE_ATTRIBUTES; },
-                     30000) &&
+    return PumpUntil([&] { return GetFileAttributesA((path + ".done").c_str()) != INVALID_FILE_ATTRIBUTES; }, 30000) &&
            DeleteFileA((path + ".done").c_str());
 }
 
@@ -113,33 +108,21 @@ bool KeyExists(HKEY hive) {
 }
 
 bool StoreRaw(const char* name, DWORD type, const void* data, DWORD length, HKEY hive) {
-    HKEY key = nullptr;
-    if (RegCreateKeyExA(hive, KeyName, 0, nullptr, 0, KEY_WRITE, nullptr, &key, nullptr) != ERROR_SUCCESS)
-        return false;
-    const LONG r = RegSetValueExA(key, name, 0, type, static_cast<const BYTE*>(data), length);
-    RegCloseKey(key);
-    return r == ERROR_SUCCESS;
+    return RegSetKeyValueA(hive, KeyName, name, type, data, length) == ERROR_SUCCESS;  // the key made when missing
 }
 
 bool StoreNumber(const char* name, int32_t number, HKEY hive) {
-    char text[16] = {};
-    std::snprintf(text, sizeof(text), "%d", number);
-    return StoreRaw(name, REG_DWORD, text, 4, hive);
+    const std::string text = std::to_string(number) + std::string(4, '\0');
+    return StoreRaw(name, REG_DWORD, text.data(), 4, hive);
 }
 
 std::string RawValue(const char* name, HKEY hive) {
     BYTE data[64];
     DWORD type = 0, length = sizeof(data);
-    HKEY key = nullptr;
-    if (RegOpenKeyExA(hive, KeyName, 0, KEY_QUERY_VALUE, &key) != ERROR_SUCCESS) return "";
-    const bool read = RegQueryValueExA(key, name, nullptr, &type, data, &length) == ERROR_SUCCESS;
-    RegCloseKey(key);
+    const bool read = RegGetValueA(hive, KeyName, name, RRF_RT_ANY | RRF_NOEXPAND, &type, data, &length) == ERROR_SUCCESS;
     std::string out = read ? std::to_string(type) + ":" : "";
-    char hex[4];
-    for (DWORD b = 0; read && b < length; ++b) {
-        std::snprintf(hex, sizeof(hex), " %02x", data[b]);
-        out += hex;
-    }
+    const char* hex = "0123456789abcdef";
+    for (DWORD b = 0; read && b < length; ++b) out += {' ', hex[data[b] >> 4], hex[data[b] & 15]};
     return out;
 }
 
@@ -158,13 +141,11 @@ namespace {
 BOOL CALLBACK FindMain(HWND window, LPARAM data) {
     auto* program = reinterpret_cast<Program*>(data);
     char cls[32] = {};
-    GetClassNameA(window, cls, sizeof(cls));
     DWORD pid = 0;
+    GetClassNameA(window, cls, sizeof(cls));
     GetWindowThreadProcessId(window, &pid);
-    if (pid != program->Process.dwProcessId || lstrcmpA(cls, "Sombrel Player") != 0 || !IsWindowVisible(window))
-        return TRUE;
-    program->Window = window;
-    return FALSE;
+    const bool found = pid == program->Process.dwProcessId && lstrcmpA(cls, "Sombrel Player") == 0 && IsWindowVisible(window);
+    return found ? (program->Window = window, FALSE) : TRUE;
 }
 }  // namespace
 

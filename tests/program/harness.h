@@ -7,8 +7,6 @@
 #include <string>
 #include <vector>
 
-// ---------------------------------------------------------------- waiting
-
 // Runs this thread's messages (the hosted window's, the devices' notices)
 // until `done` holds or `ms` have passed; false when the time ran out.
 template <typename F>
@@ -26,15 +24,9 @@ bool PumpUntil(F done, DWORD ms) {
     }
 }
 
-// ---------------------------------------------------------------- message boxes
-
-// A message box as the user sees it.
-struct Box {
-    std::string Caption;
-    std::string Text;
-    HICON Icon;        // the system icon shown (LoadIconA(nullptr, IDI_...)), nullptr for none
-    int32_t Buttons;   // visible buttons
-};
+// A message box as the user sees it: caption, text, the system icon shown
+// (LoadIconA(nullptr, IDI_...), nullptr for none) and its visible buttons.
+struct Box { std::string Caption, Text; HICON Icon; int32_t Buttons; };
 Box ReadBox(HWND box);
 
 // In the program's process: from StartAnsweringBoxes on, a thread timer
@@ -45,17 +37,13 @@ extern bool (*HoldBox)(const Box& box);
 void StartAnsweringBoxes();
 std::vector<std::string> BoxTexts();   // the texts noted, then forgotten
 
-// ---------------------------------------------------------------- the harness
-
 // Wine's path for a Unix path ("/a/b" is "Z:\a\b").
 std::string WindowsPath(const std::string& path);
 // The folder the harness gave this run (SOMBREL_WORK), as a Windows path.
 std::string WorkDir();
-// Asks the harness outside Wine (stop-sound-server, start-sound-server,
-// screenshot) and waits for it to confirm; false without a harness.
+// Asks the harness outside Wine (a screenshot) and waits for it to confirm;
+// false without a harness.
 bool AskHarness(const char* request, const std::string& detail = "");
-
-// ---------------------------------------------------------------- the settings key
 
 // "Software\Sombrel" below HKEY_LOCAL_MACHINE (the default) or
 // HKEY_CURRENT_USER in the throw-away prefix.
@@ -67,12 +55,7 @@ std::string RawValue(const char* name, HKEY hive = HKEY_LOCAL_MACHINE);  // "typ
 int32_t ValueCount(HKEY hive = HKEY_LOCAL_MACHINE);
 bool DenyKey(HKEY hive = HKEY_LOCAL_MACHINE);                  // an empty access list: nobody may write
 
-// ---------------------------------------------------------------- another process
-
-struct Program {
-    PROCESS_INFORMATION Process;
-    HWND Window;   // its visible main window
-};
+struct Program { PROCESS_INFORMATION Process; HWND Window; };  // Window: its visible main window
 // Starts `exe` from its own folder and waits up to 30 s for its window.
 bool Launch(Program* program, const std::string& exe);
 // The boxes the program has open, newest last.
